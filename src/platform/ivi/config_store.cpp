@@ -1,0 +1,141 @@
+#include "qzivi/config_store.h"
+
+#include "qzivi/ivi_common.h"
+
+#include <cerrno>
+#include <cstdlib>
+#include <cstring>
+#include <fstream>
+#include <sstream>
+#include <sys/stat.h>
+
+namespace qzivi::ivi {
+
+namespace {
+
+DriverSession EmbeddedSampleFGen() {
+    return {"SampleFGen", std::string(kBuiltinModule),           "QZSimFgen", "SIM::FGEN0",
+            "Simulate=1", {{"Channel1", "1"}, {"Channel2", "2"}}};
+}
+
+bool Exists(const std::string& path) {
+    struct stat info {};
+    return ::stat(path.c_str(), &info) == 0;
+}
+
+std::string Env(const char* name) {
+    const char* value = std::getenv(name);
+    return value != nullptr ? value : "";
+}
+
+} // namespace
+
+const DriverSession* ConfigStore::Find(std::string_view logicalName) const {
+    for (const auto& session : sessions)
+        if (EqualsNoCase(session.logicalName, logicalName)) return &session;
+    return nullptr;
+}
+
+ConfigStore ParseConfigStore(std::string_view text, const std::string& path) {
+    ConfigStore store;
+    store.path = path;
+    int lineNumber = 0;
+    auto fail = [&](const std::string& why) -> void {
+        throw StatusError(IVI_ERROR_CONFIG_STORE_INVALID,
+                          "configuration store " + (path.empty() ? std::string("text") : path) +
+                              ", line " + std::to_string(lineNumber) + ": " + why);
+    };
+    std::istringstream lines{std::string(text)};
+    std::string raw;
+    while (std::getline(lines, raw)) {
+        ++lineNumber;
+        const std::string_view line = Trim(raw);
+        if (line.empty() || line.front() == '#' || line.front() == ';') continue;
+        if (line.front() == '[') {
+            if (line.back() != ']') fail("a section header must end with ']'");
+            const std::string name(Trim(line.substr(1, line.size() - 2)));
+            if (name.empty()) fail("the logical name in brackets is empty");
+            if (store.Find(name) != nullptr)
+                fail("the logical name \"" + name + "\" is defined twice");
+            store.sessions.push_back({name, {}, {}, {}, {}, {}});
+            continue;
+        }
+        const auto equals = line.find('=');
+        if (equals == std::string_view::npos) fail("expected \"key = value\" or \"[LogicalName]\"");
+        const std::string_view key = Trim(line.substr(0, equals));
+        const std::string value(Trim(line.substr(equals + 1)));
+        if (store.sessions.empty()) {
+            if (key != "trace")
+                fail("\"" + std::string(key) + "\" must stand inside a [LogicalName] section");
+            store.traceFile = value;
+            continue;
+        }
+        DriverSession& session = store.sessions.back();
+        if (key == "module") {
+            session.module = value;
+        } else if (key == "prefix") {
+            session.prefix = value;
+        } else if (key == "resource") {
+            session.resource = value;
+        } else if (key == "options") {
+            session.options = value;
+        } else if (key.starts_with("channel ") || key.starts_with("channel\t")) {
+            const std::string virtualName(Trim(key.substr(8)));
+            if (virtualName.empty() || value.empty())
+                fail("a channel line reads \"channel Virtual = Physical\"");
+            for (const auto& [known, physical] : session.virtualNames)
+                if (known == virtualName)
+                    fail("the channel name \"" + virtualName + "\" is mapped twice");
+            session.virtualNames.emplace_back(virtualName, value);
+        } else {
+            fail("unknown key \"" + std::string(key) + "\"");
+        }
+    }
+    for (const auto& session : store.sessions) {
+        if (session.module.empty())
+            throw StatusError(IVI_ERROR_CONFIG_STORE_INVALID,
+                              "configuration store " + path + ": logical name \"" +
+                                  session.logicalName + "\" has no module");
+        if (session.module != kBuiltinModule && session.prefix.empty())
+            throw StatusError(IVI_ERROR_CONFIG_STORE_INVALID,
+                              "configuration store " + path + ": logical name \"" +
+                                  session.logicalName + "\" names a module file but no prefix");
+    }
+    if (store.Find("SampleFGen") == nullptr) store.sessions.push_back(EmbeddedSampleFGen());
+    return store;
+}
+
+void RefuseIfWritableByOthers(const std::string& path, std::string_view what) {
+    struct stat info {};
+    if (::stat(path.c_str(), &info) != 0) return; // the caller reports a missing file its own way
+    if ((info.st_mode & S_IWOTH) != 0)
+        throw StatusError(IVI_ERROR_FILE_NOT_SECURE,
+                          std::string(what) + " \"" + path +
+                              "\" can be written by any user and is refused; "
+                              "remove that permission (chmod o-w)");
+}
+
+std::string FindConfigStoreFile() {
+    if (const std::string named = Env("QZIVI_CONFIG_STORE"); !named.empty()) return named;
+    std::string home = Env("XDG_CONFIG_HOME");
+    if (home.empty() && !Env("HOME").empty()) home = Env("HOME") + "/.config";
+    if (!home.empty() && Exists(home + "/qzivi/qzivi.conf")) return home + "/qzivi/qzivi.conf";
+    const std::string system = std::string(QZIVI_SYSCONFDIR) + "/qzivi.conf";
+    return Exists(system) ? system : std::string();
+}
+
+ConfigStore LoadConfigStore() {
+    const std::string path = FindConfigStoreFile();
+    if (path.empty()) return ParseConfigStore("", "");
+    std::ifstream file(path, std::ios::binary);
+    if (!file)
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                          "configuration store \"" + path +
+                              "\" cannot be read: " + std::strerror(errno));
+    RefuseIfWritableByOthers(path, "configuration store");
+    std::ostringstream text;
+    text << file.rdbuf();
+    return ParseConfigStore(text.str(), path);
+}
+
+} // namespace qzivi::ivi

@@ -1,0 +1,62 @@
+// The configuration store: which driver session a logical name opens.
+//
+// A small text file that people edit. The class driver reads the first of these that exists:
+//   1. the file named by the environment variable QZIVI_CONFIG_STORE,
+//   2. $XDG_CONFIG_HOME/qzivi/qzivi.conf (by default ~/.config/qzivi/qzivi.conf),
+//   3. <system folder>/qzivi.conf (/etc/qzivi/qzivi.conf).
+// An embedded default defines "SampleFGen" as the built-in simulator unless the file does.
+//
+//   # comment
+//   trace = /tmp/qzivi-trace.log        (optional; before the first section)
+//   [MyFgen]                            (a logical name)
+//   module   = builtin                  (or the path of an IVI-C shared library, relative to
+//                                        the store's folder)
+//   prefix   = QZSimFgen                (the prefix of the module's functions)
+//   resource = SIM::FGEN0
+//   options  = Simulate=1, DriverSetup=...
+//   channel Channel1 = 1                (virtual channel name = the driver's name)
+#pragma once
+
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+namespace qzivi::ivi {
+
+inline constexpr std::string_view kBuiltinModule = "builtin";
+
+struct DriverSession {
+    std::string logicalName;
+    std::string module;
+    std::string prefix;
+    std::string resource;
+    std::string options;
+    std::vector<std::pair<std::string, std::string>> virtualNames; // application's -> driver's
+};
+
+struct ConfigStore {
+    std::string path; // the file read; empty when only the embedded default stands
+    std::string traceFile;
+    std::vector<DriverSession> sessions;
+
+    // Logical names compare without regard to case, as IVI's do.
+    const DriverSession* Find(std::string_view logicalName) const;
+};
+
+// Parses the text of a store. Throws StatusError(IVI_ERROR_CONFIG_STORE_INVALID) naming `path`
+// and the line. The embedded default is added.
+ConfigStore ParseConfigStore(std::string_view text, const std::string& path);
+
+// The path the search order gives, or "" if no file exists.
+std::string FindConfigStoreFile();
+
+// Reads the store the search order gives. Throws StatusError for a file that cannot be read, is
+// malformed, or can be written by others.
+ConfigStore LoadConfigStore();
+
+// Throws StatusError(IVI_ERROR_FILE_NOT_SECURE) if others than the owner and group may write the
+// file, since a driver it names runs inside the caller's process.
+void RefuseIfWritableByOthers(const std::string& path, std::string_view what);
+
+} // namespace qzivi::ivi

@@ -1,0 +1,83 @@
+#include "qzivi/trace.h"
+
+#include "qzivi/ivi_common.h"
+
+#include <cstdio>
+#include <fstream>
+#include <mutex>
+
+namespace qzivi::ivi {
+
+namespace detail {
+std::atomic<bool> g_traceOn{false};
+}
+
+namespace {
+std::mutex g_mutex;
+TraceSink g_sink;
+std::ofstream g_file;
+std::string g_filePath;
+
+void UpdateSwitch() {
+    detail::g_traceOn.store(g_sink != nullptr || g_file.is_open());
+}
+} // namespace
+
+std::string TraceRecord::Line() const {
+    char tail[64];
+    std::snprintf(tail, sizeof tail, " [%.3f us]", static_cast<double>(duration.count()) / 1000.0);
+    const std::string result = status == 0 ? "0" : "0x" + StatusHex(status);
+    return function + "(" + arguments + ") = " + result + tail;
+}
+
+TraceSink SetTraceSink(TraceSink sink) {
+    std::lock_guard lock(g_mutex);
+    std::swap(g_sink, sink);
+    UpdateSwitch();
+    return sink;
+}
+
+void SetTraceFile(const std::string& path) {
+    std::lock_guard lock(g_mutex);
+    if (path == g_filePath) return;
+    g_file.close();
+    g_filePath.clear();
+    if (!path.empty()) {
+        g_file.open(path, std::ios::app);
+        if (!g_file) {
+            UpdateSwitch();
+            throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                              "the trace file \"" + path + "\" cannot be opened for writing");
+        }
+        g_filePath = path;
+    }
+    UpdateSwitch();
+}
+
+std::string TraceFile() {
+    std::lock_guard lock(g_mutex);
+    return g_filePath;
+}
+
+void Trace(const TraceRecord& record) {
+    std::lock_guard lock(g_mutex);
+    if (g_file.is_open()) g_file << record.Line() << '\n' << std::flush;
+    if (g_sink) g_sink(record);
+}
+
+TraceRecorder::TraceRecorder() {
+    previous_ = SetTraceSink([this](const TraceRecord& record) { records_.push_back(record); });
+}
+
+TraceRecorder::~TraceRecorder() {
+    SetTraceSink(std::move(previous_));
+}
+
+std::vector<std::string> TraceRecorder::Functions() const {
+    std::vector<std::string> names;
+    for (const auto& record : records_)
+        names.push_back(record.function);
+    return names;
+}
+
+} // namespace qzivi::ivi

@@ -1,0 +1,88 @@
+// The call trace: what the class driver records, in order, to the in-process sink and to a file.
+#include "qzivi/trace.h"
+#include "test_support.h"
+
+#include <gmock/gmock.h>
+
+#include <fstream>
+
+using qzivi::ivi::TraceRecorder;
+using qzivi::test::Session;
+using qzivi::test::StoreScope;
+using ::testing::ElementsAre;
+using ::testing::StartsWith;
+
+namespace {
+
+std::vector<std::string> Lines(const std::string& path) {
+    std::ifstream file(path);
+    std::vector<std::string> lines;
+    for (std::string line; std::getline(file, line);)
+        lines.push_back(line);
+    return lines;
+}
+
+TEST(Trace, RecordsEveryCallInOrderWithArgumentsAndStatus) {
+    StoreScope scope;
+    TraceRecorder recorder;
+    {
+        Session s;
+        IviFgen_ConfigureStandardWaveform(s.vi(), "Channel1", IVIFGEN_VAL_WFM_SINE, 2, 0, 1e3, 0);
+        IviFgen_ConfigureOutputImpedance(s.vi(), "Channel9", 50);
+        ViReal64 frequency = 0;
+        IviFgen_GetAttributeViReal64(s.vi(), "Channel1", IVIFGEN_ATTR_FUNC_FREQUENCY, &frequency);
+    }
+    EXPECT_THAT(recorder.Functions(),
+                ElementsAre("IviFgen_InitWithOptions", "IviFgen_ConfigureStandardWaveform",
+                            "IviFgen_ConfigureOutputImpedance", "IviFgen_GetAttributeViReal64",
+                            "IviFgen_close"));
+    const auto& r = recorder.Records();
+    EXPECT_EQ(r[0].arguments.substr(0, 25), "\"SampleFGen\", 0, 1, \"\", &");
+    EXPECT_EQ(r[1].arguments, r[1].arguments.substr(0, r[1].arguments.find(',')) +
+                                  ", \"Channel1\", 1, 2, 0, 1000, 0");
+    EXPECT_EQ(r[1].status, VI_SUCCESS);
+    EXPECT_EQ(r[2].status, IVI_ERROR_UNKNOWN_CHANNEL_NAME);
+    EXPECT_THAT(r[2].Line(), ::testing::HasSubstr(") = 0xBFFA0020 ["));
+    EXPECT_THAT(r[3].arguments, ::testing::EndsWith("\"Channel1\", 1250104, &1000"));
+    for (const auto& record : r)
+        EXPECT_THAT(record.Line(), StartsWith(record.function + "("));
+}
+
+TEST(Trace, WritesOneLineACallToTheFileNamedByTheEnvironment) {
+    StoreScope scope;
+    const std::string path = (scope.Dir() / "io.log").string();
+    ::setenv("QZIVI_TRACE", path.c_str(), 1);
+    {
+        Session s;
+        IviFgen_ConfigureOutputMode(s.vi(), IVIFGEN_VAL_OUTPUT_FUNC);
+    }
+    qzivi::ivi::SetTraceFile("");
+    const auto lines = Lines(path);
+    ASSERT_EQ(lines.size(), 3u);
+    EXPECT_THAT(lines[0], StartsWith("IviFgen_InitWithOptions(\"SampleFGen\""));
+    EXPECT_THAT(lines[1], StartsWith("IviFgen_ConfigureOutputMode("));
+    EXPECT_THAT(lines[2], StartsWith("IviFgen_close("));
+}
+
+TEST(Trace, TheStoreCanSwitchTheFileOn) {
+    StoreScope scope;
+    const std::string path = (scope.Dir() / "store-trace.log").string();
+    scope.UseStore("trace = " + path + "\n[Bench]\nmodule = builtin\n");
+    { Session s("", "Bench"); }
+    qzivi::ivi::SetTraceFile("");
+    EXPECT_THAT(Lines(path), ElementsAre(StartsWith("IviFgen_InitWithOptions(\"Bench\""),
+                                         StartsWith("IviFgen_close(")));
+}
+
+TEST(Trace, FailedOpensAreTracedToo) {
+    StoreScope scope;
+    TraceRecorder recorder;
+    ViSession vi = 0;
+    IviFgen_InitWithOptions("Nowhere", VI_FALSE, VI_FALSE, "", &vi);
+    ASSERT_EQ(recorder.Records().size(), 1u);
+    EXPECT_EQ(recorder.Records()[0].status, IVI_ERROR_LOGICAL_NAME_NOT_FOUND);
+    EXPECT_THAT(recorder.Records()[0].Line(),
+                StartsWith("IviFgen_InitWithOptions(\"Nowhere\", 0, 0, \"\", &?) = 0xBFFA1101"));
+}
+
+} // namespace
