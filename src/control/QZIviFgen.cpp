@@ -1,0 +1,228 @@
+#include "qzivi/control/QZIviFgen.h"
+
+#include "qzivi/control/Host.h"
+#include "qzivi/control/Panel.h"
+#include "qzivi/driver/ErrorModule.h"
+#include "qzivi/model/PropertyBag.h"
+
+namespace qzivi {
+
+QZIviFgen::QZIviFgen(IQZIviFgenHost* host) : m_oHost(host) {
+    m_oIO = std::make_unique<CIviFgenIOImp>();
+    m_oProp = CIviFgenPropImp::Create();
+    m_oErr = std::make_shared<CIviErrorReport>();
+    m_oIO->Construct(m_oProp, m_oErr);
+    m_oProp->Attach(m_oErr);
+    ConnectPropertySet();
+    m_cError = m_oErr->Error.Connect(
+        [this](std::int32_t code, const std::string& source, const std::string& text) { IviError(code, source, text); });
+    m_cWarning = m_oErr->Warning.Connect([this](std::int32_t code, const std::string& source, const std::string& text) {
+        IviWarning(code, source, text);
+    });
+    m_cInitialized = m_oErr->Initialized.Connect([this] { Initialized(); });
+    m_cConfigured = m_oIO->Configured.Connect([this] { Configured(); });
+}
+
+QZIviFgen::~QZIviFgen() {
+    try {
+        if (m_oUI && m_oHost) m_oHost->RemoveChild("UI");
+    } catch (...) {
+    }
+    m_oUI.reset();
+    try {
+        m_oProp->Detach();
+    } catch (...) {
+    }
+    m_oIO.reset(); // closes an open session
+    m_cPropertyChange.Disconnect();
+    m_oProp.reset();
+    m_cError.Disconnect();
+    m_cWarning.Disconnect();
+    m_cInitialized.Disconnect();
+    m_oErr.reset();
+}
+
+void QZIviFgen::ConnectPropertySet() {
+    m_cPropertyChange = m_oProp->PropertyChange.Connect([this](const std::string& name) {
+        if (m_oHost) m_oHost->PropertyChanged(name);
+    });
+}
+
+template <typename F>
+auto QZIviFgen::Frame(const char* source, F&& body) -> decltype(body()) {
+    try {
+        return body();
+    } catch (...) {
+        HandleError(source, m_oProp->ExceptionOnError() ? -1 : 0, m_oErr.get());
+        if constexpr (!std::is_void_v<decltype(body())>) return {};
+    }
+}
+
+// ---- Host notices ------------------------------------------------------------------------------
+
+void QZIviFgen::InitProperties() {
+    try {
+        m_oProp->InitProperties();
+    } catch (...) {
+    }
+    FinishLoad();
+}
+
+void QZIviFgen::ReadProperties(const PropertyBag& bag) {
+    try {
+        m_oProp->ReadProperties(bag, "", true);
+    } catch (...) { // a half-read set carries on; the load still finishes
+    }
+    FinishLoad();
+}
+
+void QZIviFgen::WriteProperties(PropertyBag& bag) {
+    try {
+        m_oProp->WriteProperties(bag, "", true);
+    } catch (...) {
+    }
+}
+
+void QZIviFgen::FinishLoad() {
+    try {
+        SetDisplayName(m_oHost ? m_oHost->DisplayName() : std::string());
+    } catch (...) {
+    }
+}
+
+void QZIviFgen::AmbientChanged(const std::string& name) {
+    try {
+        if (name == "UserMode") {
+            if (m_oHost && m_oHost->UserMode()) {
+                if (m_oUI) m_oUI->UiState(m_oUI->UiState() & ~1);
+                FinishLoad();
+            }
+        } else if (name == "DisplayName") {
+            SetDisplayName(m_oHost ? m_oHost->DisplayName() : std::string());
+        }
+    } catch (...) {
+    }
+}
+
+void QZIviFgen::SetDisplayName(const std::string& name) {
+    m_sDisplayName = name;
+    m_oProp->SetPath(name);
+}
+
+// ---- Methods -----------------------------------------------------------------------------------
+
+void QZIviFgen::Init(bool DoIDQuery, bool DoReset, const std::string& OptionString, std::int32_t ReInitBehavior) {
+    Frame("Init", [&] { m_oIO->Init(DoIDQuery, DoReset, OptionString, ReInitBehavior); });
+}
+
+void QZIviFgen::CloseSession() {
+    Frame("CloseSession", [&] { m_oIO->CloseSession(); });
+}
+
+std::int32_t QZIviFgen::GetLastIviError() {
+    return Frame("GetLastIviError", [&] { return m_oErr->GetLastIviError(); });
+}
+
+void QZIviFgen::AboutBox() {
+    Frame("AboutBox", [&] {
+        if (m_oHost) m_oHost->ShowAboutBox();
+    });
+}
+
+// ---- Properties --------------------------------------------------------------------------------
+
+std::string QZIviFgen::LogicalName() {
+    return Frame("LogicalName", [&] { return m_oProp->LogicalName(); });
+}
+void QZIviFgen::LogicalName(const std::string& value) {
+    Frame("LogicalName", [&] { m_oProp->LogicalName(value); });
+}
+
+std::shared_ptr<QZIviConfigurations> QZIviFgen::Configurations() {
+    return Frame("Configurations", [&] { return m_oProp->Configurations(); });
+}
+
+std::int32_t QZIviFgen::UIStyle() {
+    return Frame("UIStyle", [&] { return m_oProp->UIStyle(); });
+}
+void QZIviFgen::UIStyle(std::int32_t value) {
+    Frame("UIStyle", [&] { m_oProp->UIStyle(value); });
+}
+
+bool QZIviFgen::Enabled() {
+    return Frame("Enabled", [&] { return m_oProp->Enabled(); });
+}
+void QZIviFgen::Enabled(bool value) {
+    Frame("Enabled", [&] {
+        m_oProp->Enabled(value);
+        if (m_oUI) m_oUI->Enabled(value);
+    });
+}
+
+bool QZIviFgen::AutoConfigure() {
+    return Frame("AutoConfigure", [&] { return m_oProp->AutoConfigure(); });
+}
+void QZIviFgen::AutoConfigure(bool value) {
+    Frame("AutoConfigure", [&] { m_oProp->AutoConfigure(value); });
+}
+
+std::shared_ptr<QZIviFgenSequences> QZIviFgen::Sequences() {
+    return Frame("Sequences", [&] { return m_oProp->Sequences(); });
+}
+std::shared_ptr<QZIviFgenArbWaveforms> QZIviFgen::Waveforms() {
+    return Frame("Waveforms", [&] { return m_oProp->Waveforms(); });
+}
+std::shared_ptr<QZIviFgenChannels> QZIviFgen::Channels() {
+    return Frame("Channels", [&] { return m_oProp->Channels(); });
+}
+std::shared_ptr<QZIviFgenInternalConfig> QZIviFgen::Internal() {
+    return Frame("Internal", [&] { return m_oProp->Internal(); });
+}
+
+std::int32_t QZIviFgen::RefClockSource() {
+    return Frame("RefClockSource", [&] { return m_oProp->RefClockSource(); });
+}
+void QZIviFgen::RefClockSource(std::int32_t value) {
+    Frame("RefClockSource", [&] { m_oProp->RefClockSource(value); });
+}
+
+std::int32_t QZIviFgen::OutputMode() {
+    return Frame("OutputMode", [&] { return m_oProp->OutputMode(); });
+}
+void QZIviFgen::OutputMode(std::int32_t value) {
+    Frame("OutputMode", [&] { m_oProp->OutputMode(value); });
+}
+
+std::int32_t QZIviFgen::Extensions() {
+    return Frame("Extensions", [&] { return m_oProp->Extensions(); });
+}
+void QZIviFgen::Extensions(std::int32_t value) {
+    Frame("Extensions", [&] { m_oProp->Extensions(value); });
+}
+
+bool QZIviFgen::AutoStopStart() {
+    return Frame("AutoStopStart", [&] { return m_oProp->AutoStopStart(); });
+}
+void QZIviFgen::AutoStopStart(bool value) {
+    Frame("AutoStopStart", [&] { m_oProp->AutoStopStart(value); });
+}
+
+double QZIviFgen::ArbSampleRate() {
+    return Frame("ArbSampleRate", [&] { return m_oProp->ArbSampleRate(); });
+}
+void QZIviFgen::ArbSampleRate(double value) {
+    Frame("ArbSampleRate", [&] { m_oProp->ArbSampleRate(value); });
+}
+
+bool QZIviFgen::ExceptionOnError() {
+    return Frame("ExceptionOnError", [&] { return m_oProp->ExceptionOnError(); });
+}
+void QZIviFgen::ExceptionOnError(bool value) {
+    Frame("ExceptionOnError", [&] { m_oProp->ExceptionOnError(value); });
+}
+
+std::int32_t QZIviFgen::SessionHandle() {
+    return Frame("SessionHandle", [&] { return static_cast<std::int32_t>(m_oErr->hSession()); });
+}
+
+} // namespace qzivi

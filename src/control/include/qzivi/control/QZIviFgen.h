@@ -1,0 +1,99 @@
+// QZIviFgen: the one object the host sees. Every public member forwards to the property set, the
+// session and error report, or the engine, in one guarded frame: a failure fires IviError and
+// reaches the caller as a Failure only when ExceptionOnError is true.
+#pragma once
+
+#include "qzivi/driver/CIviErrorReport.h"
+#include "qzivi/engine/CIviFgenIOImp.h"
+#include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/support/event.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+namespace qzivi {
+
+class IQZIviFgenHost;
+class IQZIviFgenPanel;
+class PropertyBag;
+
+class QZIviFgen {
+public:
+    // `host` may be null: the control then behaves as at run time with no panel.
+    explicit QZIviFgen(IQZIviFgenHost* host = nullptr);
+    ~QZIviFgen();
+    QZIviFgen(const QZIviFgen&) = delete;
+    QZIviFgen& operator=(const QZIviFgen&) = delete;
+
+    // ---- The host's life-cycle notices; none of them lets a failure out ----
+    void InitProperties();                 // defaults for a new instance
+    void ReadProperties(const PropertyBag& bag); // a stored instance
+    void WriteProperties(PropertyBag& bag);
+    void AmbientChanged(const std::string& name);
+
+    // ---- Methods ----
+    void Init(bool DoIDQuery = false, bool DoReset = false, const std::string& OptionString = "",
+              std::int32_t ReInitBehavior = qziviNoOp);
+    void CloseSession();
+    std::int32_t GetLastIviError();
+    void AboutBox();
+
+    // ---- Properties ----
+    std::string LogicalName();
+    void LogicalName(const std::string& value);
+    std::shared_ptr<QZIviConfigurations> Configurations();
+    std::int32_t UIStyle();
+    void UIStyle(std::int32_t value);
+    bool Enabled();
+    void Enabled(bool value);
+    bool AutoConfigure();
+    void AutoConfigure(bool value);
+    std::shared_ptr<QZIviFgenSequences> Sequences();
+    std::shared_ptr<QZIviFgenArbWaveforms> Waveforms();
+    std::shared_ptr<QZIviFgenChannels> Channels();
+    std::shared_ptr<QZIviFgenInternalConfig> Internal();
+    std::int32_t RefClockSource();
+    void RefClockSource(std::int32_t value);
+    std::int32_t OutputMode();
+    void OutputMode(std::int32_t value);
+    std::int32_t Extensions();
+    void Extensions(std::int32_t value);
+    bool AutoStopStart();
+    void AutoStopStart(bool value);
+    double ArbSampleRate();
+    void ArbSampleRate(double value);
+    bool ExceptionOnError();
+    void ExceptionOnError(bool value);
+    std::int32_t SessionHandle();
+
+    // ---- Events ----
+    Event<std::int32_t, const std::string&, const std::string&> IviError;
+    Event<std::int32_t, const std::string&, const std::string&> IviWarning;
+    Event<> Configured;
+    Event<> Initialized;
+
+    // The host's name of this control; it prefixes every error source of the property tree.
+    const std::string& DisplayName() const { return m_sDisplayName; }
+
+private:
+    template <typename F>
+    auto Frame(const char* source, F&& body) -> decltype(body());
+    void FinishLoad();
+    void SetDisplayName(const std::string& name);
+    void ConnectPropertySet();
+
+    IQZIviFgenHost* m_oHost;
+    std::unique_ptr<CIviFgenIOImp> m_oIO;
+    std::shared_ptr<CIviFgenPropImp> m_oProp;
+    std::shared_ptr<CIviErrorReport> m_oErr;
+    std::shared_ptr<IQZIviFgenPanel> m_oUI;
+    std::string m_sDisplayName;
+    Connection m_cPropertyChange;
+    Connection m_cError;
+    Connection m_cWarning;
+    Connection m_cInitialized;
+    Connection m_cConfigured;
+};
+
+} // namespace qzivi

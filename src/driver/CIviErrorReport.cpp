@@ -1,0 +1,301 @@
+#include "qzivi/driver/CIviErrorReport.h"
+
+#include "qzivi/driver/ErrorModule.h"
+#include "qzivi/driver/StringTable.h"
+#include "qzivi/support/failure.h"
+
+#include <cstdio>
+#include <cstring>
+
+namespace qzivi {
+
+namespace {
+
+// Sets InSessionMgrCall for one call into a session object; a failure leaves it set.
+template <typename F>
+auto SessionMgrCall(F&& call) {
+    InSessionMgrCall = true;
+    if constexpr (std::is_void_v<decltype(call())>) {
+        call();
+        InSessionMgrCall = false;
+    } else {
+        auto result = call();
+        InSessionMgrCall = false;
+        return result;
+    }
+}
+
+} // namespace
+
+std::string TrimAtNull(const char* buffer, std::size_t size) {
+    const void* nul = std::memchr(buffer, '\0', size);
+    return nul != nullptr ? std::string(buffer, static_cast<const char*>(nul)) : std::string();
+}
+
+void CIviSaveErrorInfo::SaveInfo(std::int32_t number, std::string source, std::string description) {
+    number_ = number;
+    source_ = std::move(source);
+    description_ = std::move(description);
+    saved_ = true;
+}
+
+void CIviSaveErrorInfo::Throw() {
+    if (!saved_) return;
+    saved_ = false;
+    throw Failure(number_, source_, description_);
+}
+
+CIviErrorReport::CIviErrorReport() {
+    try {
+        SessionMgr_ = SessionManager::Create();
+    } catch (...) {
+        SessionMgr_ = nullptr; // a missing or broken library means direct mode
+    }
+}
+
+CIviErrorReport::~CIviErrorReport() = default;
+
+// ---- Session and state --------------------------------------------------------------------------
+
+void CIviErrorReport::state(std::int32_t newState) {
+    StateChanged(newState, state_);
+    state_ = newState;
+}
+
+void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy,
+                                         std::int32_t& result) {
+    if ((forbidden & state_) != 0) {
+        if (state_ & IviStateClosed) DoStdError(-31600, source);
+        if (state_ & IviStateInitialized) DoStdError(-31601, source);
+        DoStdError(-31602, source);
+    }
+    result = state_;
+    if (setBusy) state(IviStateBusy);
+}
+
+ViSession CIviErrorReport::hSession() const {
+    if (IviSession_) return static_cast<ViSession>(SessionMgrCall([&] { return IviSession_->Handle(1); }));
+    return sessionNumber_;
+}
+
+void CIviErrorReport::hSession(ViSession session) {
+    if (!IviSession_) sessionNumber_ = session;
+}
+
+bool CIviErrorReport::IsInitialized() const {
+    if (!UsingSessionMgr()) return sessionNumber_ != 0;
+    if (!IviSession_) return false;
+    return SessionMgrCall([&] { return IviSession_->IsOpen(); });
+}
+
+std::string CIviErrorReport::BuildOptionString(bool doReset, bool doIDQuery, const std::string& optionString) {
+    std::string text = std::string("Reset=") + (doReset ? "1" : "0") + ",IDQuery=" + (doIDQuery ? "1" : "0");
+    if (!optionString.empty()) text += "," + optionString;
+    return text;
+}
+
+void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset, const std::string& optionString,
+                           std::int32_t reInitBehavior) {
+    try {
+        if (name.empty()) name = lastLogicalName_;
+        if (name != lastLogicalName_) reInitBehavior = qziviCloseAndInit;
+        if (IsInitialized()) {
+            if (reInitBehavior == qziviNoOp) return;
+            if (reInitBehavior == qziviCloseAndInit)
+                CloseSession(true);
+            else
+                DoStdError(-31612, "Init");
+        }
+        std::int32_t present = 0;
+        CheckForValidState(IviStateBusy, "Init", true, present);
+        if (UsingSessionMgr()) {
+            InSessionMgrCall = true;
+            IviSession_ = SessionMgr_->GetSession("IVI::IVIFGEN::" + name, 0);
+            IviSession_->Open(BuildOptionString(doReset, doIDQuery, optionString));
+            InSessionMgrCall = false;
+            state(IviStateInitialized);
+            lastLogicalName_ = name;
+        } else {
+            ViSession session = 0;
+            const ViStatus status = IviFgen_InitWithOptions(name.c_str(), ToViBoolean(doIDQuery),
+                                                            ToViBoolean(doReset), optionString.c_str(), &session);
+            IviCheckError(status, "Init", 0, "");
+            hSession(session);
+            state(IviStateInitialized);
+            lastLogicalName_ = name;
+        }
+        if (!IsSpecVersionOk()) DoStdError(-31610, "Init");
+        Initialized();
+    } catch (...) {
+        const PendingFailure failure = CurrentFailure();
+        savedError_.SaveInfo(failure.number, failure.source, failure.description);
+        try {
+            CloseSession(false);
+        } catch (...) {
+        }
+        try {
+            state(IviStateClosed);
+        } catch (...) {
+        }
+        IviSession_.reset();
+        savedError_.Throw();
+    }
+}
+
+void CIviErrorReport::CloseSession(bool raiseAgain) {
+    try {
+        std::int32_t present = 0;
+        CheckForValidState(IviStateClosed | IviStateBusy, "CloseSession", true, present);
+        if (UsingSessionMgr()) {
+            IviSession_.reset();
+        } else {
+            const ViStatus status = IviFgen_close(sessionNumber_);
+            sessionNumber_ = 0;
+            IviCheckError(status, "CloseSession", 0, "");
+        }
+        state(IviStateClosed);
+        SessionClosed();
+    } catch (...) {
+        try {
+            state(IviStateClosed);
+        } catch (...) {
+        }
+        IviSession_.reset();
+        if (raiseAgain) ReRaise();
+    }
+}
+
+bool CIviErrorReport::IsSpecVersionOk() {
+    ViInt32 version = 0;
+    IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MAJOR_VERSION, &version);
+    return version >= 2 || IsVxFgenCompliant();
+}
+
+bool CIviErrorReport::IsVxFgenCompliant() {
+    ViChar prefix[10] = {};
+    IviFgen_GetAttributeViString(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_PREFIX, sizeof prefix, prefix);
+    if (std::strncmp(prefix, "vxFgen", 6) != 0) return false;
+    ViInt32 major = 0, minor = 0;
+    IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_MAJOR_VERSION, &major);
+    IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_MINOR_VERSION, &minor);
+    const std::string minorText = std::to_string(minor < 0 ? -static_cast<std::int64_t>(minor) : minor);
+    return major >= 1 && minorText.front() >= '5';
+}
+
+Variant CIviErrorReport::GetLogicalNames(const std::string& className) {
+    std::shared_ptr<SessionManager> manager;
+    try {
+        manager = SessionManager::Create();
+    } catch (...) {
+    }
+    if (manager) return manager->ListSessions(className, 1, 0);
+    ViInt32 list = 0, count = 0;
+    Ivi_GetLogicalNamesList(&list, &count);
+    Variant names;
+    if (count > 0) {
+        std::vector<Variant> items;
+        for (ViInt32 i = 1; i <= count; ++i) {
+            ViChar buffer[512] = {};
+            ViBoolean found = VI_FALSE;
+            Ivi_GetNthLogicalName(list, i, buffer, sizeof buffer, &found);
+            items.emplace_back(TrimAtNull(buffer, sizeof buffer));
+        }
+        names = Variant::Array(std::move(items));
+    }
+    Ivi_DisposeLogicalNamesList(list);
+    return names;
+}
+
+// ---- Errors -------------------------------------------------------------------------------------
+
+std::int32_t CIviErrorReport::MapIviError(ViStatus status) {
+    struct RangeMap {
+        std::uint32_t from, to, mask;
+        std::int32_t base;
+        int sign;
+    };
+    static constexpr RangeMap ranges[] = {
+        {0xBFFA0000u, 0xBFFA1FFFu, 0xFFFu, -30700, -1}, {0xBFFA2000u, 0xBFFA3FFFu, 0xFFFu, -31000, -1},
+        {0xBFFA4000u, 0xBFFA6FFFu, 0xFFFu, -31500, -1}, {0xBFFC0000u, 0xBFFCFFFFu, 0xFFFFu, -30900, -1},
+        {0xBFFF0000u, 0xBFFFFFFFu, 0xFFFFu, -30500, -1}, {0x3FFA0000u, 0x3FFA1FFFu, 0xFFFu, 30700, 1},
+        {0x3FFA2000u, 0x3FFA3FFFu, 0xFFFu, 31000, 1},   {0x3FFA4000u, 0x3FFA6FFFu, 0xFFFu, 31500, 1},
+        {0x3FFC0000u, 0x3FFCFFFFu, 0xFFFFu, 30900, 1},  {0x3FFF0000u, 0x3FFFFFFFu, 0xFFFFu, 30500, 1},
+    };
+    if (status == static_cast<ViStatus>(0x3FFF0080u)) return 31629;
+    // Signed comparison within each range, as the statuses are signed 32-bit values.
+    for (const auto& range : ranges) {
+        const auto from = static_cast<ViStatus>(range.from);
+        const auto to = static_cast<ViStatus>(range.to);
+        if (status >= from && status <= to) {
+            const auto low = static_cast<std::int32_t>(static_cast<std::uint32_t>(status) & range.mask);
+            return range.base + range.sign * low;
+        }
+    }
+    return status;
+}
+
+std::string CIviErrorReport::BuildIviDescription(ViStatus status, const std::string& extra) const {
+    ViChar message[256] = {};
+    ViChar elaboration[256] = {};
+    ViSession session = 0;
+    try {
+        session = hSession();
+    } catch (...) { // the texts are a courtesy: a session that cannot be named gives the generic ones
+    }
+    IviFgen_error_message(session, status, message);
+    IviFgen_GetAttributeViString(session, "", IVI_ATTR_ERROR_ELABORATION, sizeof elaboration, elaboration);
+    std::string text;
+    if (!extra.empty()) text += "(" + extra + ") ";
+    text += TrimAtNull(message, sizeof message);
+    const std::string more = TrimAtNull(elaboration, sizeof elaboration);
+    if (!more.empty()) text += " " + more;
+    char hex[16];
+    std::snprintf(hex, sizeof hex, "%X", static_cast<unsigned>(status));
+    text += status > 0 ? " [IVI Warning Code:  " : " [IVI Error Code:  ";
+    text += hex;
+    text += "]";
+    return text;
+}
+
+ViStatus CIviErrorReport::IviCheckError(ViStatus status, std::string source, std::int32_t flags,
+                                        const std::string& extra) {
+    if (status == 0) {
+        lastIviError_ = 0;
+        return status;
+    }
+    const std::int32_t code = MapIviError(status);
+    lastIviError_ = code;
+    if (code == status) return status;
+    if (!source.empty())
+        lastSource_ = source;
+    else
+        source = lastSource_;
+    const std::string description = BuildIviDescription(status, extra);
+    if (flags & 8) return status;
+    if (status > 0) {
+        Warning(code, source, description);
+        return status;
+    }
+    throw Failure(code, source, description);
+}
+
+void CIviErrorReport::RaiseErrorEvents(std::int32_t code, const std::string& source, const std::string& description) {
+    AllError(code, source, description);
+    Error(code, source, description);
+    LastErrorNumber_ = code;
+    LastErrorSource_ = source;
+    LastErrorDescription_ = description;
+}
+
+void CIviErrorReport::DoStdError(std::int32_t code, const std::string& source, ViStatus iviStatus,
+                                 const std::string& extra) {
+    std::string description;
+    try {
+        description = LoadResString(-code) + " (" + source + ")";
+    } catch (...) {
+    }
+    if (iviStatus < 0) description += "  " + BuildIviDescription(iviStatus, extra);
+    throw Failure(code, source, description);
+}
+
+} // namespace qzivi

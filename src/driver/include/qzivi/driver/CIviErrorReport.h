@@ -1,0 +1,122 @@
+// CIviErrorReport: the owner of the instrument session, its state, and the error path that turns
+// driver statuses and fixed conditions into numbered failures and events.
+#pragma once
+
+#include "IviFgen.h"
+#include "qzivi/driver/SessionManager.h"
+#include "qzivi/support/event.h"
+#include "qzivi/support/variant.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+namespace qzivi {
+
+// The session states, single bits so that a set of them fits in one mask.
+enum IviStates : std::int32_t {
+    IviStateClosed = 1,
+    IviStateInitialized = 2,
+    IviStateConfigured = 4,
+    IviStateBusy = 8,
+};
+
+enum QZIviReInitBehaviors : std::int32_t {
+    qziviNoOp = 0,
+    qziviCloseAndInit = 1,
+    qziviRaiseError = 2,
+};
+
+// Holds a failure across the clean-up of Init.
+class CIviSaveErrorInfo {
+public:
+    void SaveInfo(std::int32_t number, std::string source, std::string description);
+    // Raises the stored failure again, without help file and context; does nothing if none.
+    void Throw();
+
+private:
+    std::int32_t number_ = 0;
+    std::string source_;
+    std::string description_;
+    bool saved_ = false;
+};
+
+class CIviErrorReport {
+public:
+    // Looks for the session manager: managed mode if it is there, direct mode otherwise.
+    CIviErrorReport();
+    ~CIviErrorReport();
+    CIviErrorReport(const CIviErrorReport&) = delete;
+    CIviErrorReport& operator=(const CIviErrorReport&) = delete;
+
+    // ---- Session and state ----
+    void Init(std::string& name, bool doIDQuery, bool doReset, const std::string& optionString,
+              std::int32_t reInitBehavior);
+    void CloseSession(bool raiseAgain);
+
+    std::int32_t state() const { return state_; }
+    void state(std::int32_t newState); // fires StateChanged(new, old) first
+
+    // Refuses, through DoStdError, a call whose forbidden mask meets the present state;
+    // otherwise gives the present state in `result` and, if asked, turns busy.
+    void CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy, std::int32_t& result);
+
+    ViSession hSession() const;
+    void hSession(ViSession session);
+    bool IsInitialized() const;
+    bool UsingSessionMgr() const { return SessionMgr_ != nullptr; }
+    const std::shared_ptr<SessionManager>& SessionMgr() const { return SessionMgr_; }
+    const std::shared_ptr<SessionObject>& IviSession() const { return IviSession_; }
+    void IviSession(std::shared_ptr<SessionObject> session) { IviSession_ = std::move(session); }
+
+    static std::string BuildOptionString(bool doReset, bool doIDQuery, const std::string& optionString);
+    static ViBoolean ToViBoolean(bool value) { return value ? VI_TRUE : VI_FALSE; }
+    bool IsSpecVersionOk();
+    bool IsVxFgenCompliant();
+    // The logical names: the session manager's for the class, or else every name the engine knows.
+    // An array of texts, or empty when there are none.
+    Variant GetLogicalNames(const std::string& className);
+
+    // ---- Errors ----
+    static std::int32_t MapIviError(ViStatus status);
+    // Reports a driver status: warnings fire, errors raise; flags 8 only looks. Returns `status`.
+    ViStatus IviCheckError(ViStatus status, std::string source, std::int32_t flags, const std::string& extra);
+    std::int32_t GetLastIviError() const { return lastIviError_; }
+    void RaiseErrorEvents(std::int32_t code, const std::string& source, const std::string& description);
+    [[noreturn]] void DoStdError(std::int32_t code, const std::string& source, ViStatus iviStatus = 0,
+                                 const std::string& extra = {});
+    std::string BuildIviDescription(ViStatus status, const std::string& extra) const;
+
+    bool ExceptionOnError() const { return exceptionOnError_; }
+    void ExceptionOnError(bool value) { exceptionOnError_ = value; }
+    std::int32_t LastErrorNumber() const { return LastErrorNumber_; }
+    const std::string& LastErrorDescription() const { return LastErrorDescription_; }
+    const std::string& LastErrorSource() const { return LastErrorSource_; }
+
+    // Events, in the order the system lists them.
+    Event<std::int32_t, const std::string&, const std::string&> Error;
+    Event<std::int32_t, const std::string&, const std::string&> AllError;
+    Event<std::int32_t, std::int32_t> StateChanged;
+    Event<std::int32_t, const std::string&, const std::string&> Warning;
+    Event<> Initialized;
+    Event<> SessionClosed;
+
+private:
+    std::int32_t state_ = IviStateClosed;
+    ViSession sessionNumber_ = 0;
+    std::shared_ptr<SessionManager> SessionMgr_;
+    std::shared_ptr<SessionObject> IviSession_;
+    std::string lastLogicalName_;
+    CIviSaveErrorInfo savedError_;
+
+    bool exceptionOnError_ = false;
+    std::int32_t LastErrorNumber_ = 0;
+    std::string LastErrorDescription_;
+    std::string LastErrorSource_;
+    std::int32_t lastIviError_ = 0;
+    std::string lastSource_;
+};
+
+std::string TrimAtNull(const char* buffer, std::size_t size);
+
+} // namespace qzivi

@@ -1,0 +1,253 @@
+#include "qzivi/model/PropertyBag.h"
+
+#include "qzivi/support/failure.h"
+#include "qzivi/support/text.h"
+
+#include <bit>
+#include <cstring>
+
+namespace qzivi {
+
+namespace {
+
+static_assert(std::endian::native == std::endian::little, "the block layout is written for little-endian hosts");
+
+constexpr std::uint8_t kMagic[4] = {'Q', 'Z', 'P', 'B'};
+constexpr std::uint8_t kVersion = 1;
+enum Type : std::uint8_t { kInt32 = 1, kDouble = 2, kBool = 3, kText = 4, kBytes = 5 };
+
+[[noreturn]] void WrongType(std::string_view name) {
+    RaiseRuntime(runtime::kWrongType,
+                 "The property bag value \"" + std::string(name) + "\" is not of the type it is read as.");
+}
+
+Variant AsVariant(const PropertyBag::Value& value, std::string_view name) {
+    switch (value.index()) {
+    case 0: return Variant(std::get<std::int32_t>(value));
+    case 1: return Variant(std::get<double>(value));
+    case 2: return Variant(std::get<bool>(value));
+    case 3: return Variant(std::get<std::string>(value));
+    default: WrongType(name);
+    }
+}
+
+class Writer {
+public:
+    void Raw(const void* data, std::size_t size) {
+        const auto* bytes = static_cast<const std::uint8_t*>(data);
+        out_.insert(out_.end(), bytes, bytes + size);
+    }
+    template <typename T>
+    void Put(T value) {
+        Raw(&value, sizeof value);
+    }
+    Bytes Take() { return std::move(out_); }
+
+private:
+    Bytes out_;
+};
+
+// Reads the block; every length is held against what remains before anything is allocated.
+class Reader {
+public:
+    explicit Reader(std::span<const std::uint8_t> block) : block_(block) {}
+    std::size_t Remaining() const { return block_.size() - at_; }
+    template <typename T>
+    T Get(const char* what) {
+        Need(sizeof(T), what);
+        T value;
+        std::memcpy(&value, block_.data() + at_, sizeof value);
+        at_ += sizeof value;
+        return value;
+    }
+    std::span<const std::uint8_t> Take(std::size_t size, const char* what) {
+        Need(size, what);
+        auto part = block_.subspan(at_, size);
+        at_ += size;
+        return part;
+    }
+    [[noreturn]] void Corrupt(const std::string& why) const {
+        RaiseRuntime(runtime::kImproperFile,
+                     "The property bag data is corrupt at byte " + std::to_string(at_) + ": " + why + ".");
+    }
+
+private:
+    void Need(std::size_t size, const char* what) const {
+        if (size > Remaining())
+            Corrupt(std::string(what) + " needs " + std::to_string(size) + " bytes, but only " +
+                    std::to_string(Remaining()) + " remain");
+    }
+    std::span<const std::uint8_t> block_;
+    std::size_t at_ = 0;
+};
+
+} // namespace
+
+const PropertyBag::Value* PropertyBag::Find(std::string_view name) const {
+    const auto found = index_.find(text::Lower(name));
+    return found == index_.end() ? nullptr : &entries_[found->second].value;
+}
+
+void PropertyBag::Store(std::string_view name, Value value) {
+    auto [at, added] = index_.emplace(text::Lower(name), entries_.size());
+    if (added)
+        entries_.push_back({std::string(name), std::move(value)});
+    else
+        entries_[at->second].value = std::move(value);
+}
+
+void PropertyBag::Remove(std::string_view name) {
+    const auto found = index_.find(text::Lower(name));
+    if (found == index_.end()) return;
+    const std::size_t position = found->second;
+    entries_.erase(entries_.begin() + static_cast<std::ptrdiff_t>(position));
+    index_.erase(found);
+    for (auto& [key, i] : index_)
+        if (i > position) --i;
+}
+
+bool PropertyBag::Contains(std::string_view name) const { return Find(name) != nullptr; }
+
+void PropertyBag::Clear() {
+    entries_.clear();
+    index_.clear();
+}
+
+std::int32_t PropertyBag::ReadInt32(std::string_view name, std::int32_t defaultValue) const {
+    const Value* value = Find(name);
+    return value == nullptr ? defaultValue : AsVariant(*value, name).AsInt32();
+}
+
+double PropertyBag::ReadDouble(std::string_view name, double defaultValue) const {
+    const Value* value = Find(name);
+    return value == nullptr ? defaultValue : AsVariant(*value, name).AsDouble();
+}
+
+bool PropertyBag::ReadBool(std::string_view name, bool defaultValue) const {
+    const Value* value = Find(name);
+    return value == nullptr ? defaultValue : AsVariant(*value, name).AsBool();
+}
+
+std::string PropertyBag::ReadText(std::string_view name, std::string_view defaultValue) const {
+    const Value* value = Find(name);
+    return value == nullptr ? std::string(defaultValue) : AsVariant(*value, name).AsText();
+}
+
+Bytes PropertyBag::ReadBytes(std::string_view name) const {
+    const Value* value = Find(name);
+    if (value == nullptr) return {};
+    if (const auto* bytes = std::get_if<Bytes>(value)) return *bytes;
+    WrongType(name);
+}
+
+void PropertyBag::WriteInt32(std::string_view name, std::int32_t value, std::int32_t defaultValue) {
+    value == defaultValue ? Remove(name) : Store(name, value);
+}
+
+void PropertyBag::WriteDouble(std::string_view name, double value, double defaultValue) {
+    value == defaultValue ? Remove(name) : Store(name, value);
+}
+
+void PropertyBag::WriteBool(std::string_view name, bool value, bool defaultValue) {
+    value == defaultValue ? Remove(name) : Store(name, value);
+}
+
+void PropertyBag::WriteText(std::string_view name, std::string_view value, std::string_view defaultValue) {
+    value == defaultValue ? Remove(name) : Store(name, std::string(value));
+}
+
+void PropertyBag::WriteText(std::string_view name, std::string_view value) { Store(name, std::string(value)); }
+
+void PropertyBag::WriteBytes(std::string_view name, Bytes value) { Store(name, std::move(value)); }
+
+Bytes PropertyBag::Contents() const {
+    Writer w;
+    w.Raw(kMagic, sizeof kMagic);
+    w.Put(kVersion);
+    w.Put(static_cast<std::uint32_t>(entries_.size()));
+    for (const auto& [name, value] : entries_) {
+        w.Put(static_cast<std::uint16_t>(name.size()));
+        w.Raw(name.data(), name.size());
+        switch (value.index()) {
+        case 0:
+            w.Put(kInt32);
+            w.Put(std::get<std::int32_t>(value));
+            break;
+        case 1:
+            w.Put(kDouble);
+            w.Put(std::get<double>(value));
+            break;
+        case 2:
+            w.Put(kBool);
+            w.Put(static_cast<std::uint8_t>(std::get<bool>(value) ? 1 : 0));
+            break;
+        case 3: {
+            const auto& text = std::get<std::string>(value);
+            w.Put(kText);
+            w.Put(static_cast<std::uint32_t>(text.size()));
+            w.Raw(text.data(), text.size());
+            break;
+        }
+        default: {
+            const auto& bytes = std::get<Bytes>(value);
+            w.Put(kBytes);
+            w.Put(static_cast<std::uint32_t>(bytes.size()));
+            w.Raw(bytes.data(), bytes.size());
+            break;
+        }
+        }
+    }
+    return w.Take();
+}
+
+void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
+    Reader r(block);
+    const auto magic = r.Take(sizeof kMagic, "the identifier");
+    if (std::memcmp(magic.data(), kMagic, sizeof kMagic) != 0) r.Corrupt("it does not start with \"QZPB\"");
+    const auto version = r.Get<std::uint8_t>("the version");
+    if (version != kVersion) r.Corrupt("version " + std::to_string(version) + " is not one this program reads");
+    const auto count = r.Get<std::uint32_t>("the entry count");
+    // The smallest entry takes 4 bytes: an empty name can't be, so 2 + 1 + 1 + 1 at least.
+    if (count > r.Remaining() / 4) r.Corrupt(std::to_string(count) + " entries cannot fit in what remains");
+    PropertyBag bag;
+    bag.entries_.reserve(count);
+    for (std::uint32_t i = 0; i < count; ++i) {
+        const auto nameLength = r.Get<std::uint16_t>("a name length");
+        if (nameLength == 0) r.Corrupt("an entry has an empty name");
+        const auto nameBytes = r.Take(nameLength, "a name");
+        std::string name(nameBytes.begin(), nameBytes.end());
+        if (bag.Contains(name)) r.Corrupt("the name \"" + name + "\" comes twice");
+        const auto type = r.Get<std::uint8_t>("a type");
+        switch (type) {
+        case kInt32: bag.Store(name, r.Get<std::int32_t>("an int32 value")); break;
+        case kDouble: bag.Store(name, r.Get<double>("a double value")); break;
+        case kBool: bag.Store(name, r.Get<std::uint8_t>("a bool value") != 0); break;
+        case kText: {
+            const auto size = r.Get<std::uint32_t>("a text length");
+            const auto chars = r.Take(size, "a text");
+            bag.Store(name, std::string(chars.begin(), chars.end()));
+            break;
+        }
+        case kBytes: {
+            const auto size = r.Get<std::uint32_t>("a byte array length");
+            const auto bytes = r.Take(size, "a byte array");
+            bag.Store(name, Bytes(bytes.begin(), bytes.end()));
+            break;
+        }
+        default: r.Corrupt("type " + std::to_string(type) + " of \"" + name + "\" is unknown");
+        }
+    }
+    if (r.Remaining() != 0) r.Corrupt(std::to_string(r.Remaining()) + " bytes follow the last entry");
+    *this = std::move(bag);
+}
+
+bool operator==(const PropertyBag& a, const PropertyBag& b) {
+    if (a.entries_.size() != b.entries_.size()) return false;
+    for (const auto& [name, value] : a.entries_) {
+        const PropertyBag::Value* other = b.Find(name);
+        if (other == nullptr || !(*other == value)) return false;
+    }
+    return true;
+}
+
+} // namespace qzivi

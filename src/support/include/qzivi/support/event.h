@@ -1,0 +1,73 @@
+// Events: handlers run synchronously, in connection order, on the caller's thread. A connection
+// ends with its Connection object; a handler may end its own or another's while the event fires.
+#pragma once
+
+#include <functional>
+#include <memory>
+#include <vector>
+
+namespace qzivi {
+
+class Connection {
+public:
+    Connection() = default;
+    explicit Connection(std::shared_ptr<bool> alive) : alive_(std::move(alive)) {}
+    Connection(Connection&&) noexcept = default;
+    Connection& operator=(Connection&& other) noexcept {
+        if (this != &other) {
+            Disconnect();
+            alive_ = std::move(other.alive_);
+        }
+        return *this;
+    }
+    Connection(const Connection&) = delete;
+    Connection& operator=(const Connection&) = delete;
+    ~Connection() { Disconnect(); }
+
+    void Disconnect() {
+        if (alive_) *alive_ = false;
+        alive_.reset();
+    }
+    bool Connected() const { return alive_ && *alive_; }
+
+private:
+    std::shared_ptr<bool> alive_;
+};
+
+template <typename... Args>
+class Event {
+public:
+    using Handler = std::function<void(Args...)>;
+
+    [[nodiscard]] Connection Connect(Handler handler) {
+        auto slot = std::make_shared<Slot>(Slot{std::move(handler), std::make_shared<bool>(true)});
+        slots_.push_back(slot);
+        return Connection(slot->alive);
+    }
+
+    void operator()(Args... args) const {
+        // A copy, so that handlers may connect and disconnect while this runs.
+        const auto slots = slots_;
+        for (const auto& slot : slots)
+            if (*slot->alive) slot->handler(args...);
+        Prune();
+    }
+
+    bool HasHandlers() const {
+        for (const auto& slot : slots_)
+            if (*slot->alive) return true;
+        return false;
+    }
+
+private:
+    struct Slot {
+        Handler handler;
+        std::shared_ptr<bool> alive;
+    };
+    void Prune() const {
+        std::erase_if(slots_, [](const std::shared_ptr<Slot>& slot) { return !*slot->alive; });
+    }
+    mutable std::vector<std::shared_ptr<Slot>> slots_;
+};
+
+} // namespace qzivi
