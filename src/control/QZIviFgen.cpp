@@ -14,11 +14,13 @@ QZIviFgen::QZIviFgen(IQZIviFgenHost* host) : m_oHost(host) {
     m_oIO->Construct(m_oProp, m_oErr);
     m_oProp->Attach(m_oErr);
     ConnectPropertySet();
-    m_cError = m_oErr->Error.Connect(
-        [this](std::int32_t code, const std::string& source, const std::string& text) { IviError(code, source, text); });
-    m_cWarning = m_oErr->Warning.Connect([this](std::int32_t code, const std::string& source, const std::string& text) {
-        IviWarning(code, source, text);
-    });
+    m_cError =
+        m_oErr->Error.Connect([this](std::int32_t code, const std::string& source,
+                                     const std::string& text) { IviError(code, source, text); });
+    m_cWarning = m_oErr->Warning.Connect(
+        [this](std::int32_t code, const std::string& source, const std::string& text) {
+            IviWarning(code, source, text);
+        });
     m_cInitialized = m_oErr->Initialized.Connect([this] { Initialized(); });
     m_cConfigured = m_oIO->Configured.Connect([this] { Configured(); });
 }
@@ -111,7 +113,8 @@ void QZIviFgen::SetDisplayName(const std::string& name) {
 
 // ---- Methods -----------------------------------------------------------------------------------
 
-void QZIviFgen::Init(bool DoIDQuery, bool DoReset, const std::string& OptionString, std::int32_t ReInitBehavior) {
+void QZIviFgen::Init(bool DoIDQuery, bool DoReset, const std::string& OptionString,
+                     std::int32_t ReInitBehavior) {
     Frame("Init", [&] { m_oIO->Init(DoIDQuery, DoReset, OptionString, ReInitBehavior); });
 }
 

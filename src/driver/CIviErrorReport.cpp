@@ -62,8 +62,8 @@ void CIviErrorReport::state(std::int32_t newState) {
     state_ = newState;
 }
 
-void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy,
-                                         std::int32_t& result) {
+void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source,
+                                         bool setBusy, std::int32_t& result) {
     if ((forbidden & state_) != 0) {
         if (state_ & IviStateClosed) DoStdError(-31600, source);
         if (state_ & IviStateInitialized) DoStdError(-31601, source);
@@ -74,7 +74,8 @@ void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::stri
 }
 
 ViSession CIviErrorReport::hSession() const {
-    if (IviSession_) return static_cast<ViSession>(SessionMgrCall([&] { return IviSession_->Handle(1); }));
+    if (IviSession_)
+        return static_cast<ViSession>(SessionMgrCall([&] { return IviSession_->Handle(1); }));
     return sessionNumber_;
 }
 
@@ -88,14 +89,16 @@ bool CIviErrorReport::IsInitialized() const {
     return SessionMgrCall([&] { return IviSession_->IsOpen(); });
 }
 
-std::string CIviErrorReport::BuildOptionString(bool doReset, bool doIDQuery, const std::string& optionString) {
-    std::string text = std::string("Reset=") + (doReset ? "1" : "0") + ",IDQuery=" + (doIDQuery ? "1" : "0");
+std::string CIviErrorReport::BuildOptionString(bool doReset, bool doIDQuery,
+                                               const std::string& optionString) {
+    std::string text =
+        std::string("Reset=") + (doReset ? "1" : "0") + ",IDQuery=" + (doIDQuery ? "1" : "0");
     if (!optionString.empty()) text += "," + optionString;
     return text;
 }
 
-void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset, const std::string& optionString,
-                           std::int32_t reInitBehavior) {
+void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
+                           const std::string& optionString, std::int32_t reInitBehavior) {
     try {
         if (name.empty()) name = lastLogicalName_;
         if (name != lastLogicalName_) reInitBehavior = qziviCloseAndInit;
@@ -117,8 +120,9 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset, cons
             lastLogicalName_ = name;
         } else {
             ViSession session = 0;
-            const ViStatus status = IviFgen_InitWithOptions(name.c_str(), ToViBoolean(doIDQuery),
-                                                            ToViBoolean(doReset), optionString.c_str(), &session);
+            const ViStatus status =
+                IviFgen_InitWithOptions(name.c_str(), ToViBoolean(doIDQuery), ToViBoolean(doReset),
+                                        optionString.c_str(), &session);
             IviCheckError(status, "Init", 0, "");
             hSession(session);
             state(IviStateInitialized);
@@ -167,18 +171,21 @@ void CIviErrorReport::CloseSession(bool raiseAgain) {
 
 bool CIviErrorReport::IsSpecVersionOk() {
     ViInt32 version = 0;
-    IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MAJOR_VERSION, &version);
+    IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MAJOR_VERSION,
+                                &version);
     return version >= 2 || IsVxFgenCompliant();
 }
 
 bool CIviErrorReport::IsVxFgenCompliant() {
     ViChar prefix[10] = {};
-    IviFgen_GetAttributeViString(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_PREFIX, sizeof prefix, prefix);
+    IviFgen_GetAttributeViString(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_PREFIX, sizeof prefix,
+                                 prefix);
     if (std::strncmp(prefix, "vxFgen", 6) != 0) return false;
     ViInt32 major = 0, minor = 0;
     IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_MAJOR_VERSION, &major);
     IviFgen_GetAttributeViInt32(hSession(), "", IVI_ATTR_SPECIFIC_DRIVER_MINOR_VERSION, &minor);
-    const std::string minorText = std::to_string(minor < 0 ? -static_cast<std::int64_t>(minor) : minor);
+    const std::string minorText =
+        std::to_string(minor < 0 ? -static_cast<std::int64_t>(minor) : minor);
     return major >= 1 && minorText.front() >= '5';
 }
 
@@ -215,11 +222,16 @@ std::int32_t CIviErrorReport::MapIviError(ViStatus status) {
         int sign;
     };
     static constexpr RangeMap ranges[] = {
-        {0xBFFA0000u, 0xBFFA1FFFu, 0xFFFu, -30700, -1}, {0xBFFA2000u, 0xBFFA3FFFu, 0xFFFu, -31000, -1},
-        {0xBFFA4000u, 0xBFFA6FFFu, 0xFFFu, -31500, -1}, {0xBFFC0000u, 0xBFFCFFFFu, 0xFFFFu, -30900, -1},
-        {0xBFFF0000u, 0xBFFFFFFFu, 0xFFFFu, -30500, -1}, {0x3FFA0000u, 0x3FFA1FFFu, 0xFFFu, 30700, 1},
-        {0x3FFA2000u, 0x3FFA3FFFu, 0xFFFu, 31000, 1},   {0x3FFA4000u, 0x3FFA6FFFu, 0xFFFu, 31500, 1},
-        {0x3FFC0000u, 0x3FFCFFFFu, 0xFFFFu, 30900, 1},  {0x3FFF0000u, 0x3FFFFFFFu, 0xFFFFu, 30500, 1},
+        {0xBFFA0000u, 0xBFFA1FFFu, 0xFFFu, -30700, -1},
+        {0xBFFA2000u, 0xBFFA3FFFu, 0xFFFu, -31000, -1},
+        {0xBFFA4000u, 0xBFFA6FFFu, 0xFFFu, -31500, -1},
+        {0xBFFC0000u, 0xBFFCFFFFu, 0xFFFFu, -30900, -1},
+        {0xBFFF0000u, 0xBFFFFFFFu, 0xFFFFu, -30500, -1},
+        {0x3FFA0000u, 0x3FFA1FFFu, 0xFFFu, 30700, 1},
+        {0x3FFA2000u, 0x3FFA3FFFu, 0xFFFu, 31000, 1},
+        {0x3FFA4000u, 0x3FFA6FFFu, 0xFFFu, 31500, 1},
+        {0x3FFC0000u, 0x3FFCFFFFu, 0xFFFFu, 30900, 1},
+        {0x3FFF0000u, 0x3FFFFFFFu, 0xFFFFu, 30500, 1},
     };
     if (status == static_cast<ViStatus>(0x3FFF0080u)) return 31629;
     // Signed comparison within each range, as the statuses are signed 32-bit values.
@@ -227,7 +239,8 @@ std::int32_t CIviErrorReport::MapIviError(ViStatus status) {
         const auto from = static_cast<ViStatus>(range.from);
         const auto to = static_cast<ViStatus>(range.to);
         if (status >= from && status <= to) {
-            const auto low = static_cast<std::int32_t>(static_cast<std::uint32_t>(status) & range.mask);
+            const auto low =
+                static_cast<std::int32_t>(static_cast<std::uint32_t>(status) & range.mask);
             return range.base + range.sign * low;
         }
     }
@@ -240,10 +253,12 @@ std::string CIviErrorReport::BuildIviDescription(ViStatus status, const std::str
     ViSession session = 0;
     try {
         session = hSession();
-    } catch (...) { // the texts are a courtesy: a session that cannot be named gives the generic ones
+    } catch (
+        ...) { // the texts are a courtesy: a session that cannot be named gives the generic ones
     }
     IviFgen_error_message(session, status, message);
-    IviFgen_GetAttributeViString(session, "", IVI_ATTR_ERROR_ELABORATION, sizeof elaboration, elaboration);
+    IviFgen_GetAttributeViString(session, "", IVI_ATTR_ERROR_ELABORATION, sizeof elaboration,
+                                 elaboration);
     std::string text;
     if (!extra.empty()) text += "(" + extra + ") ";
     text += TrimAtNull(message, sizeof message);
@@ -279,7 +294,8 @@ ViStatus CIviErrorReport::IviCheckError(ViStatus status, std::string source, std
     throw Failure(code, source, description);
 }
 
-void CIviErrorReport::RaiseErrorEvents(std::int32_t code, const std::string& source, const std::string& description) {
+void CIviErrorReport::RaiseErrorEvents(std::int32_t code, const std::string& source,
+                                       const std::string& description) {
     AllError(code, source, description);
     Error(code, source, description);
     LastErrorNumber_ = code;

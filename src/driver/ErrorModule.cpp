@@ -60,31 +60,46 @@ PendingFailure CurrentFailure() {
 }
 
 std::int32_t MapRuntimeError(PendingFailure& failure) {
-    const std::int64_t number = failure.number < 0 ? -static_cast<std::int64_t>(failure.number) : failure.number;
+    const std::int64_t number =
+        failure.number < 0 ? -static_cast<std::int64_t>(failure.number) : failure.number;
     if (number >= 30000 && number < 40000) {
         if (number == 30717)
-            failure.description = "Extension capability not supported by instrument driver.  (" + failure.source + ")";
+            failure.description = "Extension capability not supported by instrument driver.  (" +
+                                  failure.source + ")";
         return static_cast<std::int32_t>(number);
     }
     switch (number) {
-    case 13: return 30003;
-    case 6: return 30006;
+    case 13:
+        return 30003;
+    case 6:
+        return 30006;
     case 7:
     case 14:
-    case 28: return 30007;
-    case 9: return 31611;
-    case 11: return 30004;
+    case 28:
+        return 30007;
+    case 9:
+        return 31611;
+    case 11:
+        return 30004;
     case 48:
     case 49:
-    case 453: return 31605;
-    case 53: return 31606;
+    case 453:
+        return 31605;
+    case 53:
+        return 31606;
     case 382:
-    case 393: return 31608;
-    case 60040: return 31609;
-    case 60041: return 31607;
-    case 60042: return 31615;
-    case 17304: return 31614;
-    default: break;
+    case 393:
+        return 31608;
+    case 60040:
+        return 31609;
+    case 60041:
+        return 31607;
+    case 60042:
+        return 31615;
+    case 17304:
+        return 31614;
+    default:
+        break;
     }
     if (number >= 52 && number <= 76) return 31607;
     return 30000;
@@ -96,7 +111,9 @@ std::string FirstLine(std::string_view text) {
     return std::string(text.substr(0, end));
 }
 
-[[noreturn]] void ReRaise() { throw; }
+[[noreturn]] void ReRaise() {
+    throw;
+}
 
 void HandleError(std::string source, std::int32_t mode, CIviErrorReport* reporter) {
     PendingFailure failure = CurrentFailure();
@@ -123,12 +140,13 @@ void HandleError(std::string source, std::int32_t mode, CIviErrorReport* reporte
         throw Failure(kFallbackErrorNumber, source, failure.description, kHelpFile, kHelpContext);
     }
     if (mode == 1) {
-        ShowMessageBox({LoadResString(40000) + std::to_string(id) + ":  " + description, source, kHelpFile, id});
+        ShowMessageBox({LoadResString(40000) + std::to_string(id) + ":  " + description, source,
+                        kHelpFile, id});
         return;
     }
     if (mode == -1)
-        throw Failure(static_cast<std::int32_t>(static_cast<std::uint32_t>(-id) | 0x80040000u), source, description,
-                      kHelpFile, kHelpContext);
+        throw Failure(static_cast<std::int32_t>(static_cast<std::uint32_t>(-id) | 0x80040000u),
+                      source, description, kHelpFile, kHelpContext);
 }
 
 } // namespace qzivi

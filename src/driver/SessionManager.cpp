@@ -74,32 +74,39 @@ std::shared_ptr<SessionManager> SessionManager::Create() {
     if (!library) return nullptr;
     void* manager = nullptr;
     char error[1024] = {};
-    if (library->CreateManager(reinterpret_cast<VXSessionManager**>(&manager), error, sizeof error) != 0) return nullptr;
+    if (library->CreateManager(reinterpret_cast<VXSessionManager**>(&manager), error,
+                               sizeof error) != 0)
+        return nullptr;
     return std::make_shared<SessionManager>(std::move(library), manager);
 }
 
 SessionManager::SessionManager(std::shared_ptr<const SessionLibrary> library, void* manager)
     : library_(std::move(library)), manager_(manager) {}
 
-SessionManager::~SessionManager() { library_->ReleaseManager(static_cast<VXSessionManager*>(manager_)); }
+SessionManager::~SessionManager() {
+    library_->ReleaseManager(static_cast<VXSessionManager*>(manager_));
+}
 
-std::shared_ptr<SessionObject> SessionManager::GetSession(const std::string& address, std::int32_t flags) {
+std::shared_ptr<SessionObject> SessionManager::GetSession(const std::string& address,
+                                                          std::int32_t flags) {
     VXSession* session = nullptr;
     char error[2048] = {};
-    Check(library_->GetSession(static_cast<VXSessionManager*>(manager_), address.c_str(), flags, &session, error,
-                               sizeof error),
+    Check(library_->GetSession(static_cast<VXSessionManager*>(manager_), address.c_str(), flags,
+                               &session, error, sizeof error),
           error);
     return std::make_shared<SessionObject>(library_, session);
 }
 
-Variant SessionManager::ListSessions(const std::string& className, std::int32_t flags, std::int32_t reserved) {
+Variant SessionManager::ListSessions(const std::string& className, std::int32_t flags,
+                                     std::int32_t reserved) {
     VXNameList* names = nullptr;
     char error[1024] = {};
-    Check(library_->ListSessions(static_cast<VXSessionManager*>(manager_), className.c_str(), flags, reserved, &names,
-                                 error, sizeof error),
+    Check(library_->ListSessions(static_cast<VXSessionManager*>(manager_), className.c_str(), flags,
+                                 reserved, &names, error, sizeof error),
           error);
     std::vector<Variant> items;
-    for (std::int32_t i = 0; i < library_->NameCount(names); ++i) items.emplace_back(library_->Name(names, i));
+    for (std::int32_t i = 0; i < library_->NameCount(names); ++i)
+        items.emplace_back(library_->Name(names, i));
     library_->ReleaseNames(names);
     return Variant::Array(std::move(items));
 }
@@ -107,19 +114,25 @@ Variant SessionManager::ListSessions(const std::string& className, std::int32_t 
 SessionObject::SessionObject(std::shared_ptr<const SessionLibrary> library, void* session)
     : library_(std::move(library)), session_(session) {}
 
-SessionObject::~SessionObject() { library_->ReleaseSession(static_cast<VXSession*>(session_)); }
+SessionObject::~SessionObject() {
+    library_->ReleaseSession(static_cast<VXSession*>(session_));
+}
 
 void SessionObject::Open(const std::string& options) {
     char error[2048] = {};
-    Check(library_->Open(static_cast<VXSession*>(session_), options.c_str(), error, sizeof error), error);
+    Check(library_->Open(static_cast<VXSession*>(session_), options.c_str(), error, sizeof error),
+          error);
 }
 
-bool SessionObject::IsOpen() const { return library_->IsOpen(static_cast<VXSession*>(session_)) != 0; }
+bool SessionObject::IsOpen() const {
+    return library_->IsOpen(static_cast<VXSession*>(session_)) != 0;
+}
 
 std::int32_t SessionObject::Handle(std::int32_t which) const {
     std::int32_t handle = 0;
     char error[1024] = {};
-    Check(library_->Handle(static_cast<VXSession*>(session_), which, &handle, error, sizeof error), error);
+    Check(library_->Handle(static_cast<VXSession*>(session_), which, &handle, error, sizeof error),
+          error);
     return handle;
 }
 

@@ -61,7 +61,8 @@ void CIviFgenPropImp::UIStyle(std::int32_t value) {
     if (value < 0 || value > 2) {
         if (m_oErr) m_oErr->DoStdError(-30002, m_sPath + "UIStyle");
         throw Failure(-30002, m_sPath + "UIStyle",
-                      "An invalid argument has been passed to a property or method. (" + m_sPath + "UIStyle)");
+                      "An invalid argument has been passed to a property or method. (" + m_sPath +
+                          "UIStyle)");
     }
     m_lUIStyle = value;
     PropertyChange("UIStyle");
@@ -95,7 +96,8 @@ void CIviFgenPropImp::InitProperties() {
     m_oSequences->InitProperties();
 }
 
-void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& prefix, bool withConfigurations) {
+void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& prefix,
+                                     bool withConfigurations) {
     ArbSampleRate(bag.ReadDouble(prefix + "ArbSampleRate", 1000));
     AutoStopStart(bag.ReadBool(prefix + "AutoStopStart", true));
     Extensions(bag.ReadInt32(prefix + "Extensions", 3));
@@ -113,7 +115,8 @@ void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& 
     if (withConfigurations) m_oConfigurations->ReadProperties(bag);
 }
 
-void CIviFgenPropImp::WriteProperties(PropertyBag& bag, const std::string& prefix, bool withConfigurations) const {
+void CIviFgenPropImp::WriteProperties(PropertyBag& bag, const std::string& prefix,
+                                      bool withConfigurations) const {
     bag.WriteDouble(prefix + "ArbSampleRate", m_dArbSampleRate, 1000);
     bag.WriteBool(prefix + "AutoStopStart", m_bAutoStopStart, true);
     bag.WriteInt32(prefix + "Extensions", m_lExtensions, 3);
@@ -131,7 +134,8 @@ void CIviFgenPropImp::WriteProperties(PropertyBag& bag, const std::string& prefi
     if (withConfigurations) m_oConfigurations->WriteProperties(bag);
 }
 
-std::shared_ptr<CIviFgenPropImp> CIviFgenPropImp::Clone(std::shared_ptr<CIviFgenPropImp> target) const {
+std::shared_ptr<CIviFgenPropImp>
+CIviFgenPropImp::Clone(std::shared_ptr<CIviFgenPropImp> target) const {
     if (!target) target = Create();
     target->Attach(m_oErr);
     target->ArbSampleRate(ArbSampleRate());
@@ -178,8 +182,9 @@ void CIviFgenPropImp::SetPath(const std::string& name) {
     m_oSequences->SetPath(m_sPath);
 }
 
-void CIviFgenPropImp::RaiseCollectionChanged(const std::string& collectionName, const Variant& collection,
-                                             std::int32_t kind, const Variant& first, const Variant& second) {
+void CIviFgenPropImp::RaiseCollectionChanged(const std::string& collectionName,
+                                             const Variant& collection, std::int32_t kind,
+                                             const Variant& first, const Variant& second) {
     CollectionChanged(collectionName, collection, kind, first, second);
 }
 

@@ -11,7 +11,9 @@ void MemberCollection::Attach(std::shared_ptr<CIviErrorReport> errorReport,
     m_oPropSet = propSet;
 }
 
-void MemberCollection::SetPath(const std::string& parentPath) { m_sPath = JoinPath(parentPath, part_); }
+void MemberCollection::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, part_);
+}
 
 void MemberCollection::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
     bag.ReadInt32(BagPrefix(prefix, word_) + "ItemCount", 0);
@@ -21,13 +23,15 @@ void MemberCollection::WriteProperties(PropertyBag& bag, const std::string& pref
     bag.WriteInt32(BagPrefix(prefix, word_) + "ItemCount", Count(), 0);
 }
 
-void QZIviConfigurations::Attach(std::shared_ptr<CIviErrorReport> errorReport, CIviFgenPropImp* propSet,
-                                 const std::string&) {
+void QZIviConfigurations::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                                 CIviFgenPropImp* propSet, const std::string&) {
     m_oErr = std::move(errorReport);
     m_oPropSet = propSet;
 }
 
-void QZIviConfigurations::ReadProperties(const PropertyBag& bag) { bag.ReadInt32("Configurations_ItemCount", 0); }
+void QZIviConfigurations::ReadProperties(const PropertyBag& bag) {
+    bag.ReadInt32("Configurations_ItemCount", 0);
+}
 
 void QZIviConfigurations::WriteProperties(PropertyBag& bag) const {
     bag.WriteInt32("Configurations_ItemCount", Count(), 0);

@@ -10,24 +10,30 @@ namespace qzivi {
 
 namespace {
 
-static_assert(std::endian::native == std::endian::little, "the block layout is written for little-endian hosts");
+static_assert(std::endian::native == std::endian::little,
+              "the block layout is written for little-endian hosts");
 
 constexpr std::uint8_t kMagic[4] = {'Q', 'Z', 'P', 'B'};
 constexpr std::uint8_t kVersion = 1;
 enum Type : std::uint8_t { kInt32 = 1, kDouble = 2, kBool = 3, kText = 4, kBytes = 5 };
 
 [[noreturn]] void WrongType(std::string_view name) {
-    RaiseRuntime(runtime::kWrongType,
-                 "The property bag value \"" + std::string(name) + "\" is not of the type it is read as.");
+    RaiseRuntime(runtime::kWrongType, "The property bag value \"" + std::string(name) +
+                                          "\" is not of the type it is read as.");
 }
 
 Variant AsVariant(const PropertyBag::Value& value, std::string_view name) {
     switch (value.index()) {
-    case 0: return Variant(std::get<std::int32_t>(value));
-    case 1: return Variant(std::get<double>(value));
-    case 2: return Variant(std::get<bool>(value));
-    case 3: return Variant(std::get<std::string>(value));
-    default: WrongType(name);
+    case 0:
+        return Variant(std::get<std::int32_t>(value));
+    case 1:
+        return Variant(std::get<double>(value));
+    case 2:
+        return Variant(std::get<bool>(value));
+    case 3:
+        return Variant(std::get<std::string>(value));
+    default:
+        WrongType(name);
     }
 }
 
@@ -67,8 +73,8 @@ public:
         return part;
     }
     [[noreturn]] void Corrupt(const std::string& why) const {
-        RaiseRuntime(runtime::kImproperFile,
-                     "The property bag data is corrupt at byte " + std::to_string(at_) + ": " + why + ".");
+        RaiseRuntime(runtime::kImproperFile, "The property bag data is corrupt at byte " +
+                                                 std::to_string(at_) + ": " + why + ".");
     }
 
 private:
@@ -106,7 +112,9 @@ void PropertyBag::Remove(std::string_view name) {
         if (i > position) --i;
 }
 
-bool PropertyBag::Contains(std::string_view name) const { return Find(name) != nullptr; }
+bool PropertyBag::Contains(std::string_view name) const {
+    return Find(name) != nullptr;
+}
 
 void PropertyBag::Clear() {
     entries_.clear();
@@ -152,13 +160,18 @@ void PropertyBag::WriteBool(std::string_view name, bool value, bool defaultValue
     value == defaultValue ? Remove(name) : Store(name, value);
 }
 
-void PropertyBag::WriteText(std::string_view name, std::string_view value, std::string_view defaultValue) {
+void PropertyBag::WriteText(std::string_view name, std::string_view value,
+                            std::string_view defaultValue) {
     value == defaultValue ? Remove(name) : Store(name, std::string(value));
 }
 
-void PropertyBag::WriteText(std::string_view name, std::string_view value) { Store(name, std::string(value)); }
+void PropertyBag::WriteText(std::string_view name, std::string_view value) {
+    Store(name, std::string(value));
+}
 
-void PropertyBag::WriteBytes(std::string_view name, Bytes value) { Store(name, std::move(value)); }
+void PropertyBag::WriteBytes(std::string_view name, Bytes value) {
+    Store(name, std::move(value));
+}
 
 Bytes PropertyBag::Contents() const {
     Writer w;
@@ -203,12 +216,15 @@ Bytes PropertyBag::Contents() const {
 void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
     Reader r(block);
     const auto magic = r.Take(sizeof kMagic, "the identifier");
-    if (std::memcmp(magic.data(), kMagic, sizeof kMagic) != 0) r.Corrupt("it does not start with \"QZPB\"");
+    if (std::memcmp(magic.data(), kMagic, sizeof kMagic) != 0)
+        r.Corrupt("it does not start with \"QZPB\"");
     const auto version = r.Get<std::uint8_t>("the version");
-    if (version != kVersion) r.Corrupt("version " + std::to_string(version) + " is not one this program reads");
+    if (version != kVersion)
+        r.Corrupt("version " + std::to_string(version) + " is not one this program reads");
     const auto count = r.Get<std::uint32_t>("the entry count");
     // The smallest entry takes 4 bytes: an empty name can't be, so 2 + 1 + 1 + 1 at least.
-    if (count > r.Remaining() / 4) r.Corrupt(std::to_string(count) + " entries cannot fit in what remains");
+    if (count > r.Remaining() / 4)
+        r.Corrupt(std::to_string(count) + " entries cannot fit in what remains");
     PropertyBag bag;
     bag.entries_.reserve(count);
     for (std::uint32_t i = 0; i < count; ++i) {
@@ -219,9 +235,15 @@ void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
         if (bag.Contains(name)) r.Corrupt("the name \"" + name + "\" comes twice");
         const auto type = r.Get<std::uint8_t>("a type");
         switch (type) {
-        case kInt32: bag.Store(name, r.Get<std::int32_t>("an int32 value")); break;
-        case kDouble: bag.Store(name, r.Get<double>("a double value")); break;
-        case kBool: bag.Store(name, r.Get<std::uint8_t>("a bool value") != 0); break;
+        case kInt32:
+            bag.Store(name, r.Get<std::int32_t>("an int32 value"));
+            break;
+        case kDouble:
+            bag.Store(name, r.Get<double>("a double value"));
+            break;
+        case kBool:
+            bag.Store(name, r.Get<std::uint8_t>("a bool value") != 0);
+            break;
         case kText: {
             const auto size = r.Get<std::uint32_t>("a text length");
             const auto chars = r.Take(size, "a text");
@@ -234,10 +256,12 @@ void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
             bag.Store(name, Bytes(bytes.begin(), bytes.end()));
             break;
         }
-        default: r.Corrupt("type " + std::to_string(type) + " of \"" + name + "\" is unknown");
+        default:
+            r.Corrupt("type " + std::to_string(type) + " of \"" + name + "\" is unknown");
         }
     }
-    if (r.Remaining() != 0) r.Corrupt(std::to_string(r.Remaining()) + " bytes follow the last entry");
+    if (r.Remaining() != 0)
+        r.Corrupt(std::to_string(r.Remaining()) + " bytes follow the last entry");
     *this = std::move(bag);
 }
 

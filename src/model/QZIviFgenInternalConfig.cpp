@@ -11,7 +11,9 @@ void QZIviFgenInternalConfig::Attach(std::shared_ptr<CIviErrorReport> errorRepor
     m_oPropSet = propSet;
 }
 
-void QZIviFgenInternalConfig::SetPath(const std::string& parentPath) { m_sPath = JoinPath(parentPath, "Internal"); }
+void QZIviFgenInternalConfig::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, "Internal");
+}
 
 void QZIviFgenInternalConfig::InitProperties() {
     AMInternalDepth(50);

@@ -29,24 +29,27 @@ bool Variant::IsNumeric() const {
 
 double Variant::AsDouble() const {
     switch (kind_) {
-    case Kind::Number: return number_;
-    case Kind::Empty: return 0;
+    case Kind::Number:
+        return number_;
+    case Kind::Empty:
+        return 0;
     case Kind::Text:
         if (auto n = text::ParseNumber(text_)) return *n;
         break;
-    default: break;
+    default:
+        break;
     }
     RaiseRuntime(runtime::kWrongType, "An invalid type has been passed to a property or method.");
 }
 
 std::int32_t Variant::AsInt32() const {
-    return static_cast<std::int32_t>(
-        Rounded(AsDouble(), std::numeric_limits<std::int32_t>::min(), std::numeric_limits<std::int32_t>::max()));
+    return static_cast<std::int32_t>(Rounded(AsDouble(), std::numeric_limits<std::int32_t>::min(),
+                                             std::numeric_limits<std::int32_t>::max()));
 }
 
 std::int16_t Variant::AsInt16() const {
-    return static_cast<std::int16_t>(
-        Rounded(AsDouble(), std::numeric_limits<std::int16_t>::min(), std::numeric_limits<std::int16_t>::max()));
+    return static_cast<std::int16_t>(Rounded(AsDouble(), std::numeric_limits<std::int16_t>::min(),
+                                             std::numeric_limits<std::int16_t>::max()));
 }
 
 bool Variant::AsBool() const {
@@ -59,23 +62,35 @@ bool Variant::AsBool() const {
 
 std::string Variant::AsText() const {
     switch (kind_) {
-    case Kind::Text: return text_;
-    case Kind::Number: return text::FormatNumber(number_);
-    case Kind::Empty: return {};
-    default: RaiseRuntime(runtime::kWrongType, "An invalid type has been passed to a property or method.");
+    case Kind::Text:
+        return text_;
+    case Kind::Number:
+        return text::FormatNumber(number_);
+    case Kind::Empty:
+        return {};
+    default:
+        RaiseRuntime(runtime::kWrongType,
+                     "An invalid type has been passed to a property or method.");
     }
 }
 
-const std::vector<Variant>& Variant::Items() const { return array_ ? *array_ : NoItems(); }
+const std::vector<Variant>& Variant::Items() const {
+    return array_ ? *array_ : NoItems();
+}
 
 bool Variant::operator==(const Variant& other) const {
     if (kind_ != other.kind_) return false;
     switch (kind_) {
-    case Kind::Number: return number_ == other.number_;
-    case Kind::Text: return text_ == other.text_;
-    case Kind::Object: return object_ == other.object_;
-    case Kind::Array: return rows_ == other.rows_ && Items() == other.Items();
-    default: return true;
+    case Kind::Number:
+        return number_ == other.number_;
+    case Kind::Text:
+        return text_ == other.text_;
+    case Kind::Object:
+        return object_ == other.object_;
+    case Kind::Array:
+        return rows_ == other.rows_ && Items() == other.Items();
+    default:
+        return true;
     }
 }
 

@@ -29,7 +29,8 @@ std::map<std::string, std::shared_ptr<Shared>> g_shared; // by lower-case logica
 
 std::string Key(std::string_view name) {
     std::string key(name);
-    for (char& c : key) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+    for (char& c : key)
+        c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
     return key;
 }
 
@@ -45,7 +46,8 @@ std::vector<std::string> LogicalNames() {
     for (ViInt32 i = 1; i <= count; ++i) {
         ViChar name[512] = {};
         ViBoolean found = VI_FALSE;
-        if (Ivi_GetNthLogicalName(list, i, name, sizeof name, &found) >= 0 && found) names.emplace_back(name);
+        if (Ivi_GetNthLogicalName(list, i, name, sizeof name, &found) >= 0 && found)
+            names.emplace_back(name);
     }
     Ivi_DisposeLogicalNamesList(list);
     return names;
@@ -66,12 +68,15 @@ struct VXNameList {
 extern "C" {
 
 int32_t VXSessionServer_CreateManager(VXSessionManager** manager, char* error, int32_t errorSize) {
-    if (manager == nullptr) return Fail(-1, "VXSessionServer: manager is a null pointer", error, errorSize);
+    if (manager == nullptr)
+        return Fail(-1, "VXSessionServer: manager is a null pointer", error, errorSize);
     *manager = new VXSessionManager;
     return 0;
 }
 
-void VXSessionServer_ReleaseManager(VXSessionManager* manager) { delete manager; }
+void VXSessionServer_ReleaseManager(VXSessionManager* manager) {
+    delete manager;
+}
 
 int32_t VXSessionServer_GetSession(VXSessionManager* manager, const char* address, int32_t flags,
                                    VXSession** session, char* error, int32_t errorSize) {
@@ -80,16 +85,20 @@ int32_t VXSessionServer_GetSession(VXSessionManager* manager, const char* addres
         return Fail(-1, "VXSessionServer: GetSession was given a null pointer", error, errorSize);
     *session = nullptr;
     const std::string_view text(address);
-    if (text.size() < kAddressPrefix.size() || !EqualsNoCase(text.substr(0, kAddressPrefix.size()), kAddressPrefix))
+    if (text.size() < kAddressPrefix.size() ||
+        !EqualsNoCase(text.substr(0, kAddressPrefix.size()), kAddressPrefix))
         return Fail(VXSESSIONSERVER_ERROR_UNKNOWN_NAME,
-                    "The address \"" + std::string(text) + "\" is not of the form IVI::IVIFGEN::<logical name>.",
+                    "The address \"" + std::string(text) +
+                        "\" is not of the form IVI::IVIFGEN::<logical name>.",
                     error, errorSize);
     const std::string name(text.substr(kAddressPrefix.size()));
     bool known = false;
-    for (const auto& candidate : LogicalNames()) known = known || EqualsNoCase(candidate, name);
+    for (const auto& candidate : LogicalNames())
+        known = known || EqualsNoCase(candidate, name);
     if (!known)
         return Fail(VXSESSIONSERVER_ERROR_UNKNOWN_NAME,
-                    "The logical name \"" + name + "\" is not known to the session manager.", error, errorSize);
+                    "The logical name \"" + name + "\" is not known to the session manager.", error,
+                    errorSize);
     std::lock_guard lock(g_mutex);
     auto& shared = g_shared[Key(name)];
     if (!shared) shared = std::make_shared<Shared>(Shared{name, 0, 0});
@@ -98,8 +107,10 @@ int32_t VXSessionServer_GetSession(VXSessionManager* manager, const char* addres
     return 0;
 }
 
-int32_t VXSessionServer_Open(VXSession* session, const char* options, char* error, int32_t errorSize) {
-    if (session == nullptr) return Fail(-1, "VXSessionServer: Open was given a null pointer", error, errorSize);
+int32_t VXSessionServer_Open(VXSession* session, const char* options, char* error,
+                             int32_t errorSize) {
+    if (session == nullptr)
+        return Fail(-1, "VXSessionServer: Open was given a null pointer", error, errorSize);
     std::lock_guard lock(g_mutex);
     Shared& shared = *session->shared;
     if (shared.vi != 0) return 0;
@@ -115,18 +126,21 @@ int32_t VXSessionServer_Open(VXSession* session, const char* options, char* erro
                 driverOptions.push_back(std::move(option));
         }
     } catch (const qzivi::ivi::StatusError& e) {
-        return Fail(e.Status(), "The session \"" + shared.logicalName + "\" could not be opened.\n" + e.what(), error,
-                    errorSize);
+        return Fail(e.Status(),
+                    "The session \"" + shared.logicalName + "\" could not be opened.\n" + e.what(),
+                    error, errorSize);
     }
     ViSession vi = 0;
-    const ViStatus status = IviFgen_InitWithOptions(shared.logicalName.c_str(), idQuery, reset,
-                                                    qzivi::ivi::JoinOptions(driverOptions).c_str(), &vi);
+    const ViStatus status =
+        IviFgen_InitWithOptions(shared.logicalName.c_str(), idQuery, reset,
+                                qzivi::ivi::JoinOptions(driverOptions).c_str(), &vi);
     if (status < 0) {
         ViStatus code = 0;
         ViChar text[1024] = {};
         IviFgen_GetError(VI_NULL, &code, sizeof text, text);
-        return Fail(status, "The session \"" + shared.logicalName + "\" could not be opened.\n" + text, error,
-                    errorSize);
+        return Fail(status,
+                    "The session \"" + shared.logicalName + "\" could not be opened.\n" + text,
+                    error, errorSize);
     }
     shared.vi = vi;
     return 0;
@@ -138,10 +152,13 @@ int32_t VXSessionServer_IsOpen(VXSession* session) {
     return session->shared->vi != 0 ? 1 : 0;
 }
 
-int32_t VXSessionServer_Handle(VXSession* session, int32_t which, int32_t* handle, char* error, int32_t errorSize) {
+int32_t VXSessionServer_Handle(VXSession* session, int32_t which, int32_t* handle, char* error,
+                               int32_t errorSize) {
     if (session == nullptr || handle == nullptr)
         return Fail(-1, "VXSessionServer: Handle was given a null pointer", error, errorSize);
-    if (which != 1) return Fail(-1, "VXSessionServer: only handle 1, the class session, exists", error, errorSize);
+    if (which != 1)
+        return Fail(-1, "VXSessionServer: only handle 1, the class session, exists", error,
+                    errorSize);
     std::lock_guard lock(g_mutex);
     *handle = static_cast<int32_t>(session->shared->vi);
     return 0;
@@ -161,14 +178,16 @@ void VXSessionServer_ReleaseSession(VXSession* session) {
     delete session;
 }
 
-int32_t VXSessionServer_ListSessions(VXSessionManager* manager, const char* className, int32_t flags,
-                                     int32_t reserved, VXNameList** names, char* error, int32_t errorSize) {
+int32_t VXSessionServer_ListSessions(VXSessionManager* manager, const char* className,
+                                     int32_t flags, int32_t reserved, VXNameList** names,
+                                     char* error, int32_t errorSize) {
     (void)flags;
     (void)reserved;
     if (manager == nullptr || names == nullptr)
         return Fail(-1, "VXSessionServer: ListSessions was given a null pointer", error, errorSize);
     *names = new VXNameList;
-    if (className != nullptr && EqualsNoCase(className, "IVI::IviFgen")) (*names)->names = LogicalNames();
+    if (className != nullptr && EqualsNoCase(className, "IVI::IviFgen"))
+        (*names)->names = LogicalNames();
     return 0;
 }
 
@@ -177,10 +196,13 @@ int32_t VXSessionServer_NameCount(const VXNameList* names) {
 }
 
 const char* VXSessionServer_Name(const VXNameList* names, int32_t index) {
-    if (names == nullptr || index < 0 || static_cast<size_t>(index) >= names->names.size()) return nullptr;
+    if (names == nullptr || index < 0 || static_cast<size_t>(index) >= names->names.size())
+        return nullptr;
     return names->names[static_cast<size_t>(index)].c_str();
 }
 
-void VXSessionServer_ReleaseNames(VXNameList* names) { delete names; }
+void VXSessionServer_ReleaseNames(VXNameList* names) {
+    delete names;
+}
 
 } // extern "C"

@@ -28,7 +28,8 @@ int32_t VXSessionServer_GetSession(VXSessionManager* manager, const char* addres
                                    VXSession** session, char* error, int32_t errorSize);
 /* The options may hold "Reset=1" and "IDQuery=1"; the rest goes to the driver. Opening a session
  * whose driver session another object opened already does nothing. */
-int32_t VXSessionServer_Open(VXSession* session, const char* options, char* error, int32_t errorSize);
+int32_t VXSessionServer_Open(VXSession* session, const char* options, char* error,
+                             int32_t errorSize);
 /* 1 while the driver session is usable, else 0. */
 int32_t VXSessionServer_IsOpen(VXSession* session);
 /* `which` 1: the IviFgen class session number; 0 when it is not open. */
@@ -38,8 +39,9 @@ int32_t VXSessionServer_Handle(VXSession* session, int32_t which, int32_t* handl
 void VXSessionServer_ReleaseSession(VXSession* session);
 
 /* The logical names of a class ("IVI::IviFgen"); the other two arguments are reserved. */
-int32_t VXSessionServer_ListSessions(VXSessionManager* manager, const char* className, int32_t flags,
-                                     int32_t reserved, VXNameList** names, char* error, int32_t errorSize);
+int32_t VXSessionServer_ListSessions(VXSessionManager* manager, const char* className,
+                                     int32_t flags, int32_t reserved, VXNameList** names,
+                                     char* error, int32_t errorSize);
 int32_t VXSessionServer_NameCount(const VXNameList* names);
 const char* VXSessionServer_Name(const VXNameList* names, int32_t index); /* from 0 */
 void VXSessionServer_ReleaseNames(VXNameList* names);

@@ -23,7 +23,8 @@ public:
     virtual void SetSize(float width, float height) = 0;
 
     // The child collection: a panel made by its class name under a key, and its removal.
-    virtual std::shared_ptr<IQZIviFgenPanel> AddChild(const std::string& className, const std::string& key) = 0;
+    virtual std::shared_ptr<IQZIviFgenPanel> AddChild(const std::string& className,
+                                                      const std::string& key) = 0;
     virtual void RemoveChild(const std::string& key) = 0;
 
     // `Visible` of the control's entry in the parent form's control list.

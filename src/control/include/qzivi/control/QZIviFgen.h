@@ -27,7 +27,7 @@ public:
     QZIviFgen& operator=(const QZIviFgen&) = delete;
 
     // ---- The host's life-cycle notices; none of them lets a failure out ----
-    void InitProperties();                 // defaults for a new instance
+    void InitProperties();                       // defaults for a new instance
     void ReadProperties(const PropertyBag& bag); // a stored instance
     void WriteProperties(PropertyBag& bag);
     void AmbientChanged(const std::string& name);

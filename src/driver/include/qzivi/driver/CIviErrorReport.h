@@ -59,7 +59,8 @@ public:
 
     // Refuses, through DoStdError, a call whose forbidden mask meets the present state;
     // otherwise gives the present state in `result` and, if asked, turns busy.
-    void CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy, std::int32_t& result);
+    void CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy,
+                            std::int32_t& result);
 
     ViSession hSession() const;
     void hSession(ViSession session);
@@ -69,7 +70,8 @@ public:
     const std::shared_ptr<SessionObject>& IviSession() const { return IviSession_; }
     void IviSession(std::shared_ptr<SessionObject> session) { IviSession_ = std::move(session); }
 
-    static std::string BuildOptionString(bool doReset, bool doIDQuery, const std::string& optionString);
+    static std::string BuildOptionString(bool doReset, bool doIDQuery,
+                                         const std::string& optionString);
     static ViBoolean ToViBoolean(bool value) { return value ? VI_TRUE : VI_FALSE; }
     bool IsSpecVersionOk();
     bool IsVxFgenCompliant();
@@ -80,11 +82,13 @@ public:
     // ---- Errors ----
     static std::int32_t MapIviError(ViStatus status);
     // Reports a driver status: warnings fire, errors raise; flags 8 only looks. Returns `status`.
-    ViStatus IviCheckError(ViStatus status, std::string source, std::int32_t flags, const std::string& extra);
+    ViStatus IviCheckError(ViStatus status, std::string source, std::int32_t flags,
+                           const std::string& extra);
     std::int32_t GetLastIviError() const { return lastIviError_; }
-    void RaiseErrorEvents(std::int32_t code, const std::string& source, const std::string& description);
-    [[noreturn]] void DoStdError(std::int32_t code, const std::string& source, ViStatus iviStatus = 0,
-                                 const std::string& extra = {});
+    void RaiseErrorEvents(std::int32_t code, const std::string& source,
+                          const std::string& description);
+    [[noreturn]] void DoStdError(std::int32_t code, const std::string& source,
+                                 ViStatus iviStatus = 0, const std::string& extra = {});
     std::string BuildIviDescription(ViStatus status, const std::string& extra) const;
 
     bool ExceptionOnError() const { return exceptionOnError_; }

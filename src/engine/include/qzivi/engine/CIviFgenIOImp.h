@@ -21,12 +21,14 @@ public:
     CIviFgenIOImp(const CIviFgenIOImp&) = delete;
     CIviFgenIOImp& operator=(const CIviFgenIOImp&) = delete;
 
-    void Construct(std::shared_ptr<CIviFgenPropImp> propSet, std::shared_ptr<CIviErrorReport> errorReport);
+    void Construct(std::shared_ptr<CIviFgenPropImp> propSet,
+                   std::shared_ptr<CIviErrorReport> errorReport);
     void SetNewPropSet(std::shared_ptr<CIviFgenPropImp> propSet);
     const std::shared_ptr<CIviFgenPropImp>& PropSet() const { return m_oProp; }
 
     // Opens the session of the set's LogicalName, unless the set is not Enabled.
-    void Init(bool doIDQuery, bool doReset, const std::string& optionString, std::int32_t reInitBehavior);
+    void Init(bool doIDQuery, bool doReset, const std::string& optionString,
+              std::int32_t reInitBehavior);
     void CloseSession();
 
     Event<> Configured;

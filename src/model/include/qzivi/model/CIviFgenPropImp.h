@@ -57,7 +57,8 @@ public:
 
     void InitProperties();
     void ReadProperties(const PropertyBag& bag, const std::string& prefix, bool withConfigurations);
-    void WriteProperties(PropertyBag& bag, const std::string& prefix, bool withConfigurations) const;
+    void WriteProperties(PropertyBag& bag, const std::string& prefix,
+                         bool withConfigurations) const;
     // Fills `target` (a new set if none) and returns it.
     std::shared_ptr<CIviFgenPropImp> Clone(std::shared_ptr<CIviFgenPropImp> target) const;
 
@@ -96,11 +97,12 @@ public:
     const std::shared_ptr<CIviErrorReport>& ErrorReport() const { return m_oErr; }
     const std::string& Path() const { return m_sPath; }
     void SetPath(const std::string& name);
-    void RaiseCollectionChanged(const std::string& collectionName, const Variant& collection, std::int32_t kind,
-                                const Variant& first, const Variant& second);
+    void RaiseCollectionChanged(const std::string& collectionName, const Variant& collection,
+                                std::int32_t kind, const Variant& first, const Variant& second);
 
     // collection name, collection, change kind, first value, second value
-    Event<const std::string&, const Variant&, std::int32_t, const Variant&, const Variant&> CollectionChanged;
+    Event<const std::string&, const Variant&, std::int32_t, const Variant&, const Variant&>
+        CollectionChanged;
     Event<const std::string&> PropertyChange;
 
 private:

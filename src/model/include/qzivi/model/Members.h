@@ -15,9 +15,11 @@ class PropertyBag;
 
 class MemberCollection {
 public:
-    MemberCollection(std::string word, std::string part) : word_(std::move(word)), part_(std::move(part)) {}
+    MemberCollection(std::string word, std::string part)
+        : word_(std::move(word)), part_(std::move(part)) {}
 
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport, const std::shared_ptr<CIviFgenPropImp>& propSet);
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                const std::shared_ptr<CIviFgenPropImp>& propSet);
     const std::string& Path() const { return m_sPath; }
     void SetPath(const std::string& parentPath);
     std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
@@ -58,7 +60,8 @@ public:
 // of the root's Configurations); a configuration holds no configurations.
 class QZIviConfigurations {
 public:
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport, CIviFgenPropImp* propSet, const std::string& name);
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport, CIviFgenPropImp* propSet,
+                const std::string& name);
     void SetOwner(CIviFgenPropImp* propSet) { m_oPropSet = propSet; }
     CIviFgenPropImp* PropSet() const { return m_oPropSet; }
     std::int32_t Count() const { return 0; }

@@ -46,7 +46,8 @@ public:
     double InternalTriggerRate() const { return m_dInternalTriggerRate; }
     void InternalTriggerRate(double value) { m_dInternalTriggerRate = value; }
 
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport, const std::shared_ptr<CIviFgenPropImp>& propSet);
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                const std::shared_ptr<CIviFgenPropImp>& propSet);
     const std::string& Path() const { return m_sPath; }
     void SetPath(const std::string& parentPath);
     std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }

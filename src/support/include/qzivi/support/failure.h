@@ -9,10 +9,11 @@ namespace qzivi {
 
 class Failure : public std::runtime_error {
 public:
-    Failure(std::int32_t number, std::string source, std::string description, std::string helpFile = {},
-            std::int32_t helpContext = 0)
+    Failure(std::int32_t number, std::string source, std::string description,
+            std::string helpFile = {}, std::int32_t helpContext = 0)
         : std::runtime_error(description), number_(number), source_(std::move(source)),
-          description_(std::move(description)), helpFile_(std::move(helpFile)), helpContext_(helpContext) {}
+          description_(std::move(description)), helpFile_(std::move(helpFile)),
+          helpContext_(helpContext) {}
 
     std::int32_t Number() const { return number_; }
     const std::string& Source() const { return source_; }
@@ -43,7 +44,8 @@ inline constexpr std::int32_t kFileNotAccessible = 60041;
 inline constexpr std::int32_t kTooFewData = 60042;
 } // namespace runtime
 
-[[noreturn]] inline void RaiseRuntime(std::int32_t number, std::string description, std::string source = {}) {
+[[noreturn]] inline void RaiseRuntime(std::int32_t number, std::string description,
+                                      std::string source = {}) {
     throw Failure(number, std::move(source), std::move(description));
 }
 

@@ -18,7 +18,8 @@ public:
     Variant(double number) : kind_(Kind::Number), number_(number) {}
     Variant(int number) : kind_(Kind::Number), number_(number) {}
     Variant(std::int64_t number) : kind_(Kind::Number), number_(static_cast<double>(number)) {}
-    Variant(bool value) : kind_(Kind::Number), number_(value ? -1 : 0) {} // true is -1, as persisted
+    Variant(bool value)
+        : kind_(Kind::Number), number_(value ? -1 : 0) {} // true is -1, as persisted
     Variant(std::string text) : kind_(Kind::Text), text_(std::move(text)) {}
     Variant(const char* text) : kind_(Kind::Text), text_(text) {}
 
@@ -73,7 +74,9 @@ public:
     const std::vector<Variant>& Items() const;
     std::size_t Rows() const { return rows_; }
     std::size_t Columns() const { return rows_ == 0 ? Items().size() : Items().size() / rows_; }
-    const Variant& At(std::size_t row, std::size_t column) const { return Items().at(row * Columns() + column); }
+    const Variant& At(std::size_t row, std::size_t column) const {
+        return Items().at(row * Columns() + column);
+    }
 
     // Same kind and value; objects by identity, arrays item by item.
     bool operator==(const Variant& other) const;
