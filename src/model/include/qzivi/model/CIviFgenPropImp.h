@@ -2,8 +2,11 @@
 // values, owns its five members, and fixes the order of reset, read, write and clone.
 #pragma once
 
-#include "qzivi/model/Members.h"
+#include "qzivi/model/Channels.h"
+#include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/model/QZIviFgenInternalConfig.h"
+#include "qzivi/model/Sequences.h"
+#include "qzivi/model/Waveforms.h"
 #include "qzivi/support/event.h"
 #include "qzivi/support/variant.h"
 

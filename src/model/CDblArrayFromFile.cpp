@@ -1,0 +1,343 @@
+#include "qzivi/model/CDblArrayFromFile.h"
+
+#include "qzivi/support/failure.h"
+
+#include <algorithm>
+#include <bit>
+#include <cerrno>
+#include <charconv>
+#include <cmath>
+#include <cstring>
+#include <fcntl.h>
+#include <optional>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace qzivi {
+
+namespace {
+
+static_assert(std::endian::native == std::endian::little, "the integer formats are read in place");
+
+constexpr std::string_view kDelimiters = ";,\t\r\n ";
+constexpr std::size_t kReadSize = 1 << 20;
+
+[[noreturn]] void ImproperFile() {
+    RaiseRuntime(-runtime::kImproperFile, "Improper file type.");
+}
+[[noreturn]] void NotAccessible() {
+    RaiseRuntime(-runtime::kFileNotAccessible, "Couldn't access specified file.");
+}
+[[noreturn]] void TooFewData() {
+    RaiseRuntime(-runtime::kTooFewData,
+                 "The number of points requested exceeds the amount of available data.");
+}
+[[noreturn]] void OutOfRange() {
+    RaiseRuntime(runtime::kIndexOutOfRange, "Subscript out of range.");
+}
+
+// The file, open for reading as bytes; closed on every way out.
+class File {
+public:
+    explicit File(const std::string& name) {
+        if (name.empty()) NotAccessible();
+        fd_ = ::open(name.c_str(), O_RDONLY | O_CLOEXEC);
+        struct stat info {};
+        if (fd_ < 0 || ::fstat(fd_, &info) != 0 || !S_ISREG(info.st_mode)) {
+            if (fd_ >= 0) ::close(fd_);
+            NotAccessible();
+        }
+        size_ = static_cast<std::uint64_t>(info.st_size);
+    }
+    ~File() { ::close(fd_); }
+    File(const File&) = delete;
+    File& operator=(const File&) = delete;
+
+    std::uint64_t Size() const { return size_; }
+    // Reads up to `size` bytes at `offset`; fewer only at the end of the file.
+    std::size_t ReadAt(std::uint64_t offset, char* into, std::size_t size) const {
+        std::size_t done = 0;
+        while (done < size) {
+            const ssize_t got =
+                ::pread(fd_, into + done, size - done, static_cast<off_t>(offset + done));
+            if (got < 0 && errno == EINTR) continue;
+            if (got < 0) NotAccessible();
+            if (got == 0) break;
+            done += static_cast<std::size_t>(got);
+        }
+        return done;
+    }
+
+private:
+    int fd_ = -1;
+    std::uint64_t size_ = 0;
+};
+
+bool IsSpace(char c) {
+    return c == ' ' || c == '\t' || c == '\n' || c == '\r' || c == '\v' || c == '\f';
+}
+bool IsDigit(char c) {
+    return c >= '0' && c <= '9';
+}
+
+// A token as a number: it ends at its first NUL or at `end`; white space around the number, a sign,
+// a decimal point and an exponent are taken, the same under any locale.
+bool ParseToken(const char* p, const char* end, double& value) {
+    while (p < end && IsSpace(*p))
+        ++p;
+    if (p == end) return false;
+    bool negative = false;
+    if (*p == '+' || *p == '-') {
+        negative = *p == '-';
+        ++p;
+    }
+    if (p == end || !(IsDigit(*p) || *p == '.')) return false;
+    const auto [q, error] = std::from_chars(p, end, value);
+    if (error != std::errc()) return false;
+    const char* rest = q;
+    while (rest < end && IsSpace(*rest))
+        ++rest;
+    if (rest != end && *rest != '\0') return false;
+    if (negative) value = -value;
+    return true;
+}
+
+// VB's rounding of a Double to an integer: halves to the even neighbour.
+std::int64_t RoundHalfEven(double x) {
+    return static_cast<std::int64_t>(std::nearbyint(x));
+}
+
+// Integer division as the system's first language did it: towards zero; by zero it fails.
+std::int64_t IntDiv(std::int64_t a, std::int64_t b) {
+    if (b == 0) RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
+    return a / b;
+}
+
+// ---- Integer formats --------------------------------------------------------------------------
+
+template <typename Int>
+std::vector<double> ReadIntegers(const std::string& filename, std::int32_t startIndex,
+                                 std::int32_t interval, std::int32_t count, double scale) {
+    const File file(filename);
+    const auto n = static_cast<std::int64_t>(file.Size() / sizeof(Int));
+    const std::int64_t available = IntDiv(n, interval) - IntDiv(startIndex, interval);
+    const std::int64_t points = count == -1 ? available : count;
+    if (points > available) TooFewData();
+    if (points <= 0 || startIndex < 0 || interval < 0) return {};
+
+    std::vector<double> result(static_cast<std::size_t>(points));
+    const std::uint64_t step = static_cast<std::uint64_t>(interval);
+    // Elements are read in runs of whole chunks and picked out: one pass, in order.
+    std::vector<Int> chunk(kReadSize / sizeof(Int));
+    std::uint64_t element = static_cast<std::uint64_t>(startIndex);
+    std::size_t out = 0;
+    while (out < result.size()) {
+        const std::uint64_t last = element + (result.size() - out - 1) * step;
+        const std::uint64_t span = std::min<std::uint64_t>(last - element + 1, chunk.size());
+        const std::size_t got =
+            file.ReadAt(element * sizeof(Int), reinterpret_cast<char*>(chunk.data()),
+                        static_cast<std::size_t>(span * sizeof(Int))) /
+            sizeof(Int);
+        if (got == 0) NotAccessible(); // the file shrank under us
+        std::uint64_t k = 0;
+        if (step == 1) {
+            const std::size_t take = std::min<std::size_t>(got, result.size() - out);
+            for (; k < take; ++k)
+                result[out + k] = chunk[k] / scale;
+            out += take;
+        } else {
+            for (; k < got && out < result.size(); k += step)
+                result[out++] = chunk[k] / scale;
+        }
+        element += k;
+    }
+    return result;
+}
+
+// ---- Text format --------------------------------------------------------------------------------
+
+// The first block of the file, padded with NUL to a whole block, as the reader sees it.
+std::string FirstBlock(const File& file) {
+    std::string block(CDblArrayFromFile::kBlockSize, '\0');
+    file.ReadAt(0, block.data(), block.size());
+    return block;
+}
+
+// The tokens of [begin, end) split at `delimiter`, handed to `take(index, tokenBegin, tokenEnd)`
+// until it answers false.
+template <typename Take>
+void ForEachToken(const char* begin, const char* end, char delimiter, Take&& take) {
+    std::int64_t index = 0;
+    for (const char* p = begin;; ++index) {
+        const char* stop =
+            static_cast<const char*>(std::memchr(p, delimiter, static_cast<std::size_t>(end - p)));
+        if (!take(index, p, stop != nullptr ? stop : end) || stop == nullptr) return;
+        p = stop + 1;
+    }
+}
+
+// Nothing for no data; an empty array when no token converted, where the cut of the array fails.
+std::optional<std::vector<double>> SmallFile(const std::string& block, std::size_t firstDigit,
+                                             char delimiter, std::int32_t startIndex,
+                                             std::int32_t interval, std::int32_t count) {
+    const char* begin = block.data() + firstDigit;
+    const char* end = block.data() + block.size();
+    const auto tokens = static_cast<std::int64_t>(std::count(begin, end, delimiter)) + 1;
+    if (interval == 0) RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
+    const double available =
+        static_cast<double>(tokens) / interval - static_cast<double>(startIndex) / interval;
+    const std::int64_t limit = count == -1 ? RoundHalfEven(available) : count;
+    if (limit <= 0) return std::nullopt;
+    if (count != -1 && static_cast<double>(limit) > available) TooFewData();
+
+    // Tokens by position, for a step that may go backwards.
+    std::vector<std::pair<const char*, const char*>> spans;
+    spans.reserve(static_cast<std::size_t>(tokens));
+    ForEachToken(begin, end, delimiter, [&](std::int64_t, const char* a, const char* b) {
+        spans.emplace_back(a, b);
+        return true;
+    });
+    std::vector<double> result;
+    result.reserve(static_cast<std::size_t>(std::min<std::int64_t>(limit, tokens)));
+    for (std::int64_t i = startIndex;
+         i <= tokens - 1 && static_cast<std::int64_t>(result.size()) < limit; i += interval) {
+        if (i < 0) OutOfRange();
+        double value = 0;
+        if (ParseToken(spans[static_cast<std::size_t>(i)].first,
+                       spans[static_cast<std::size_t>(i)].second, value))
+            result.push_back(value);
+    }
+    return result;
+}
+
+// The block path. The text of each round is the tail of the last one and the next block, which in
+// the file are one run of bytes: [textStart, blockEnd). Bytes past the end of the file are NUL.
+std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char delimiter,
+                              std::int32_t startIndex, std::int32_t interval, std::int32_t count) {
+    const std::uint64_t length = file.Size();
+    const std::uint64_t limit =
+        count == -1 ? length : static_cast<std::uint64_t>(std::max(count, 0));
+    std::vector<double> result;
+    // Room for as many points as the file could hold; pages that are never written cost nothing.
+    result.reserve(static_cast<std::size_t>(
+        count == -1 ? length / 2 + 1 : std::min<std::uint64_t>(limit, length / 2 + 1)));
+
+    std::vector<char> buffer(kReadSize + 2 * CDblArrayFromFile::kBlockSize);
+    std::uint64_t bufferStart = 0, bufferEnd = 0; // file offsets held in the buffer
+    std::uint64_t textStart = 0, blockEnd = CDblArrayFromFile::kBlockSize;
+    std::size_t skip = firstDigit;
+    bool first = true;
+    // A step of 0 or less, or a start before the first token, reads nothing here either.
+    if (interval <= 0 || startIndex < 0) return {};
+    for (;;) {
+        const std::uint64_t realEnd = std::min(blockEnd, length);
+        if (realEnd > bufferEnd) {
+            const std::size_t keep = static_cast<std::size_t>(bufferEnd - textStart);
+            std::memmove(buffer.data(), buffer.data() + (textStart - bufferStart), keep);
+            bufferStart = textStart;
+            bufferEnd = textStart + keep +
+                        file.ReadAt(textStart + keep, buffer.data() + keep, buffer.size() - keep);
+            if (bufferEnd < realEnd) NotAccessible(); // the file shrank under us
+        }
+        const char* text = buffer.data() + (textStart - bufferStart);
+        const char* textEnd = buffer.data() + (realEnd - bufferStart);
+        const char* last = static_cast<const char*>(
+            ::memrchr(text, delimiter, static_cast<std::size_t>(textEnd - text)));
+        // Cut after the last delimiter; with none the whole text is one token and no tail is kept.
+        const char* bodyEnd = last != nullptr ? last + 1 : textEnd;
+        std::int64_t wanted = first ? startIndex : 0; // each block steps anew from its first token
+        // A body that ends in the delimiter has one more, empty, token after it: it converts to
+        // nothing and is the last of its block, so it is left out.
+        const char* tokensEnd = last != nullptr ? bodyEnd - 1 : bodyEnd;
+        ForEachToken(text + skip, tokensEnd, delimiter,
+                     [&](std::int64_t index, const char* a, const char* b) {
+                         if (result.size() >= limit) return false;
+                         if (index == wanted) {
+                             double value = 0;
+                             if (ParseToken(a, b, value)) result.push_back(value);
+                             wanted += interval;
+                         }
+                         return true;
+                     });
+        first = false;
+        skip = 0;
+        // Once the points are all taken the rest of the file cannot change the result.
+        if (blockEnd >= length || result.size() >= limit) {
+            if (count != -1 && limit >= result.size() + 1) TooFewData();
+            return result;
+        }
+        textStart = last != nullptr
+                        ? static_cast<std::uint64_t>(bodyEnd - buffer.data()) + bufferStart
+                        : blockEnd;
+        blockEnd += CDblArrayFromFile::kBlockSize;
+    }
+}
+
+std::vector<double> ReadText(const std::string& filename, std::int32_t startIndex,
+                             std::int32_t interval, std::int32_t count) {
+    std::optional<std::vector<double>> small;
+    try {
+        const File file(filename);
+        const std::string block = FirstBlock(file);
+        const std::string delimiter = CDblArrayFromFile::FindDelimiter(block);
+        if (delimiter.empty()) ImproperFile();
+        const std::size_t firstDigit = block.find_first_of("0123456789");
+        if (file.Size() > CDblArrayFromFile::kBlockSize)
+            return BlockPath(file, firstDigit, delimiter[0], startIndex, interval, count);
+        small = SmallFile(block, firstDigit, delimiter[0], startIndex, interval, count);
+    } catch (...) {
+        return {};
+    }
+    if (small && small->empty()) OutOfRange(); // the cut of the array to no element
+    return small ? std::move(*small) : std::vector<double>();
+}
+
+template <typename Int>
+std::vector<double> ReadIntegersOrNothing(const std::string& filename, std::int32_t startIndex,
+                                          std::int32_t interval, std::int32_t count, double scale) {
+    try {
+        return ReadIntegers<Int>(filename, startIndex, interval, count, scale);
+    } catch (...) {
+        return {};
+    }
+}
+
+} // namespace
+
+std::string CDblArrayFromFile::FindDelimiter(std::string_view text) {
+    const std::size_t first = text.find_first_of("0123456789");
+    const std::size_t d = first == std::string_view::npos ? text.size() + 1 : first + 1; // 1-based
+    const auto rest = static_cast<std::int64_t>(text.size()) - static_cast<std::int64_t>(d);
+    std::string_view probe;
+    if (rest >= 25)
+        probe = text.substr(d - 1, 25);
+    else if (rest >= 2)
+        probe = text.substr(d, static_cast<std::size_t>(rest));
+    else
+        return {};
+    for (char c : kDelimiters)
+        if (probe.find(c) != std::string_view::npos) return std::string(1, c);
+    return {};
+}
+
+std::vector<double> CDblArrayFromFile::RetrieveDblArray(std::int32_t fileType,
+                                                        const std::string& filename,
+                                                        std::int32_t startIndex,
+                                                        std::int32_t interval,
+                                                        std::int32_t count) const {
+    // The readers keep their own failures and give no data, but one: a small text file that has
+    // a delimiter and yet no number fails at the cut of its array.
+    switch (fileType) {
+    case DataFileASCII:
+        return ReadText(filename, startIndex, interval, count);
+    case DataFile2ByteInteger:
+        return ReadIntegersOrNothing<std::int16_t>(filename, startIndex, interval, count, 32767.0);
+    case DataFile4ByteInteger:
+        return ReadIntegersOrNothing<std::int32_t>(filename, startIndex, interval, count,
+                                                   2147483647.0);
+    default:
+        ImproperFile();
+    }
+}
+
+} // namespace qzivi

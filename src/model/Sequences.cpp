@@ -1,0 +1,429 @@
+#include "qzivi/model/Sequences.h"
+
+#include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/model/PropertyBag.h"
+
+#include <cmath>
+
+namespace qzivi {
+
+namespace {
+
+constexpr const char* kSequence = "QZIviFgenSequence";
+constexpr const char* kSequences = "QZIviFgenSequences";
+
+// A step whose failure is dropped and the work goes on, as the sample of a sequence is gathered.
+template <typename F>
+void Ignoring(F&& step) {
+    try {
+        step();
+    } catch (...) {
+    }
+}
+
+} // namespace
+
+// ---- QZIviFgenSequenceItem
+// -----------------------------------------------------------------------
+
+void QZIviFgenSequenceItem::Waveform(const std::shared_ptr<QZIviFgenArbWaveform>& value) {
+    Guard(m_oErr, "Waveform", [&] {
+        if (value) {
+            const auto propSet = PropSet();
+            if (!propSet)
+                RaiseRuntime(91,
+                             "Object variable not set: the sequence item belongs to no control.");
+            if (!propSet->Waveforms()->ContainsObject(*value))
+                StdError(m_oErr, -31618, m_sPath + "Waveform");
+        }
+        m_oWaveform = value;
+    });
+}
+
+void QZIviFgenSequenceItem::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                                   const std::shared_ptr<CIviFgenPropImp>& propSet) {
+    m_oErr = std::move(errorReport);
+    m_oPropSet = propSet;
+    m_cCollectionChanged.Disconnect();
+    if (propSet)
+        m_cCollectionChanged = propSet->CollectionChanged.Connect(
+            [this](const std::string& name, const Variant& collection, std::int32_t kind,
+                   const Variant& first, const Variant& second) {
+                OnCollectionChanged(name, collection, kind, first, second);
+            });
+}
+
+void QZIviFgenSequenceItem::OnCollectionChanged(const std::string& name, const Variant& collection,
+                                                std::int32_t kind, const Variant& first,
+                                                const Variant& second) {
+    if (name != "QZIviFgenArbWaveforms" || !m_oWaveform) return;
+    if (kind == ChangeRemoved) {
+        const auto waveforms = collection.AsObject<QZIviFgenArbWaveforms>();
+        if (waveforms && waveforms->IndexOfName(m_oWaveform->Name()) == -1) m_oWaveform = nullptr;
+    } else if (kind == ChangeRenamed) {
+        // A waveform object of another copy of the tree follows the rename of its twin here.
+        const std::string now = first.AsText(), before = second.AsText();
+        if (!now.empty() && m_oWaveform->Name() != now && m_oWaveform->Name() == before)
+            m_oWaveform->Name(now);
+    }
+}
+
+void QZIviFgenSequenceItem::InitProperties() {
+    Waveform(nullptr);
+    Iterations(0);
+}
+
+void QZIviFgenSequenceItem::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "SequenceItem");
+    Iterations(bag.ReadInt32(p + "Iterations", 0));
+    const std::int32_t index = bag.ReadInt32(p + "Waveform", 0);
+    if (index > 0)
+        if (const auto propSet = PropSet()) Waveform(propSet->Waveforms()->Item(index));
+}
+
+void QZIviFgenSequenceItem::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
+    const std::string p = BagPrefix(prefix, "SequenceItem");
+    bag.WriteInt32(p + "Iterations", m_lIterations, 0);
+    const auto propSet = PropSet();
+    const std::int32_t index =
+        m_oWaveform && propSet ? propSet->Waveforms()->IndexOfName(m_oWaveform->Name()) : 0;
+    bag.WriteInt32(p + "Waveform", index, 0);
+}
+
+void QZIviFgenSequenceItem::Clone(QZIviFgenSequenceItem& target) const {
+    target.Waveform(m_oWaveform);
+    target.Iterations(m_lIterations);
+}
+
+// ---- QZIviFgenSequence
+// ---------------------------------------------------------------------------
+
+std::int32_t QZIviFgenSequence::IndexOfObject(const QZIviFgenSequenceItem* item) const {
+    for (std::int32_t i = 1; i <= Count(); ++i)
+        if (At(i).get() == item) return i;
+    return -1;
+}
+
+std::shared_ptr<QZIviFgenSequenceItem> QZIviFgenSequence::SequenceItem(const Variant& Index) {
+    return Guard(m_oErr, "SequenceItem", [&] {
+        std::shared_ptr<QZIviFgenSequenceItem> found;
+        if (Index.IsNumber()) {
+            const std::int32_t position = Index.AsInt32();
+            if (position >= 1 && position <= Count()) found = At(position);
+        }
+        if (!found) StdError(m_oErr, -31626, m_sPath + "Item");
+        return found;
+    });
+}
+
+std::shared_ptr<QZIviFgenSequenceItem>
+QZIviFgenSequence::Add(const std::shared_ptr<QZIviFgenArbWaveform>& Waveform,
+                       std::int32_t Iterations) {
+    return Guard(m_oErr, "Add", [&] {
+        auto item = std::make_shared<QZIviFgenSequenceItem>();
+        item->Attach(m_oErr, PropSet());
+        item->InitProperties();
+        // The setter's own frame reports a foreign waveform; it ends this Add only if it raises.
+        item->Waveform(Waveform);
+        item->Iterations(Iterations);
+        items_.push_back(item);
+        if (const auto propSet = PropSet())
+            propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
+                                            ChangeAdded, Count(), "");
+        return item;
+    });
+}
+
+void QZIviFgenSequence::Remove(const Variant& Index) {
+    Guard(m_oErr, "Remove", [&] {
+        const std::int32_t position = Index.IsNumeric() ? Index.AsInt32() : 0;
+        if (position < 1 || position > Count()) StdError(m_oErr, -31611, m_sPath + "Remove");
+        items_.erase(items_.begin() + (position - 1));
+        if (const auto propSet = PropSet())
+            propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
+                                            ChangeRemoved, position, "");
+    });
+}
+
+void QZIviFgenSequence::Name(const std::string& value) {
+    const std::string old = m_sName;
+    m_sName = value;
+    if (const auto propSet = PropSet())
+        propSet->RaiseCollectionChanged(kSequences, Variant::Object(propSet->Sequences()),
+                                        ChangeRenamed, value, old);
+}
+
+std::int32_t QZIviFgenSequence::DataSize() {
+    return Guard(
+        m_oErr, "DataSize",
+        [&] {
+            std::int64_t total = 0;
+            for (const auto& item : items_) {
+                if (!item->Waveform() || item->Iterations() < 1)
+                    StdError(m_oErr, -31616, m_sPath + "DataSize");
+                total +=
+                    static_cast<std::int64_t>(item->Waveform()->DataSize()) * item->Iterations();
+            }
+            if (total > 0x7FFFFFFF) RaiseRuntime(runtime::kOverflow, "Overflow.");
+            return static_cast<std::int32_t>(total);
+        },
+        true);
+}
+
+std::int32_t QZIviFgenSequence::PreviewDataSize() {
+    std::int64_t total = 0;
+    for (const auto& item : items_)
+        if (item->Waveform()) total += item->Waveform()->DataSize();
+    return static_cast<std::int32_t>(std::min<std::int64_t>(total, 0x7FFFFFFF));
+}
+
+SampleBlocks QZIviFgenSequence::GetDataSample(std::int32_t StartIndex, std::int32_t Interval,
+                                              std::int32_t Count) {
+    return Guard(
+        m_oErr, "GetDataSample",
+        [&] {
+            const std::int32_t n = this->Count();
+            std::vector<std::int64_t> size(static_cast<std::size_t>(n) + 1),
+                iters(static_cast<std::size_t>(n) + 1);
+            std::int64_t cum = 0, firstIter = 0, offset = 0, blocks = 0;
+            std::int32_t startItem = 0;
+            bool found = false;
+            for (std::int32_t i = 1; i <= n; ++i) {
+                const auto& item = At(i);
+                if (!item->Waveform()) StdError(m_oErr, -31616, m_sPath + "GetDataSample");
+                Ignoring([&] { size[i] = item->Waveform()->DataSize(); });
+                iters[i] = m_bCollapseIterations ? 1 : item->Iterations();
+                const std::int64_t total = size[i] * iters[i];
+                if (cum + total < StartIndex) {
+                    cum += total;
+                } else if (!found) {
+                    startItem = i;
+                    if (size[i] != 0)
+                        firstIter = static_cast<std::int64_t>(
+                            std::trunc(double(StartIndex - cum) / double(size[i])));
+                    offset = StartIndex - cum - firstIter * size[i];
+                    found = true;
+                    blocks = -firstIter;
+                }
+                if (found) blocks += iters[i];
+            }
+            m_bCollapseIterations = false;
+            SampleBlocks table;
+            const std::size_t room = blocks > 0 ? static_cast<std::size_t>(blocks) : 0;
+            table.reserve(room);
+
+            std::int64_t collected = 0;
+            bool collecting = true;
+            for (std::int32_t i = 1; i <= n && collecting; ++i) {
+                if (i < startItem) continue;
+                const auto waveform = At(i)->Waveform();
+                const std::int64_t repetitions = i == startItem ? iters[i] - firstIter : iters[i];
+                for (std::int64_t r = 1; r <= repetitions && collecting; ++r) {
+                    const std::int64_t remain = Count == -1 ? -1 : Count - collected;
+                    const std::int64_t from = i == startItem && r == 1 ? offset : 0;
+                    const bool whole =
+                        Count == -1 || double(size[i] - from) / Interval <= double(remain);
+                    Points block;
+                    Ignoring([&] {
+                        if (waveform->Source() > 0)
+                            block = waveform->GetDataSample(
+                                static_cast<std::int32_t>(from), Interval,
+                                whole ? -1 : static_cast<std::int32_t>(remain));
+                        else
+                            block = waveform->Data();
+                    });
+                    if (block) {
+                        collected += static_cast<std::int64_t>(block->size());
+                        if (table.size() < room) table.push_back(block);
+                    }
+                    collecting = whole;
+                }
+            }
+            if (Count != -1 && collected < Count) {
+                // Reported, but the blocks collected are the result all the same.
+                try {
+                    StdError(m_oErr, -31615, m_sPath + "GetDataSample");
+                } catch (...) {
+                    HandleError("GetDataSample", 0, m_oErr.get());
+                }
+            }
+            return table;
+        },
+        true);
+}
+
+std::vector<std::int32_t> QZIviFgenSequence::WaveformHandles() const {
+    std::vector<std::int32_t> handles;
+    for (const auto& item : items_)
+        handles.push_back(item->Waveform() ? item->Waveform()->WaveformHandle() : 0);
+    return handles;
+}
+
+std::vector<std::int32_t> QZIviFgenSequence::IterationCounts() const {
+    std::vector<std::int32_t> counts;
+    for (const auto& item : items_)
+        counts.push_back(item->Iterations());
+    return counts;
+}
+
+void QZIviFgenSequence::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                               const std::shared_ptr<CIviFgenPropImp>& propSet) {
+    m_oErr = std::move(errorReport);
+    m_oPropSet = propSet;
+    for (const auto& item : items_)
+        item->Attach(m_oErr, propSet);
+}
+
+void QZIviFgenSequence::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, "Sequence");
+    for (const auto& item : items_)
+        item->SetPath(m_sPath);
+}
+
+void QZIviFgenSequence::InitProperties() {
+    items_.clear();
+    Name("");
+    m_lSequenceHandle = 0;
+    m_sUniqueId = NewUniqueId();
+    m_lCurrentItem = 1;
+}
+
+void QZIviFgenSequence::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "Sequence");
+    Name(bag.ReadText(p + "Name", ""));
+    m_sUniqueId = NewUniqueId();
+    m_lCurrentItem = 1;
+    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
+    if (count <= 0) return;
+    CheckItemCount(count, bag.Size(), p + "ItemCount");
+    items_.clear();
+    for (std::int32_t i = 1; i <= count; ++i) {
+        auto item = std::make_shared<QZIviFgenSequenceItem>();
+        item->Attach(m_oErr, PropSet());
+        item->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
+        items_.push_back(std::move(item));
+    }
+}
+
+void QZIviFgenSequence::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
+    const std::string p = BagPrefix(prefix, "Sequence");
+    bag.WriteText(p + "Name", m_sName, "");
+    bag.WriteInt32(p + "ItemCount", Count(), 0);
+    std::int32_t i = 0;
+    for (const auto& item : items_)
+        item->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
+}
+
+void QZIviFgenSequence::Clone(QZIviFgenSequence& target) const {
+    target.Name(m_sName);
+    target.SetSequenceHandle(m_lSequenceHandle);
+    target.UniqueId(m_sUniqueId);
+    target.CurrentItem(m_lCurrentItem);
+    for (std::int32_t i = 1; i <= Count(); ++i) {
+        target.Add(nullptr, 0);
+        if (i <= target.Count()) At(i)->Clone(*target.At(i));
+    }
+}
+
+// ---- QZIviFgenSequences
+// --------------------------------------------------------------------------
+
+std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Item(const Variant& Index) {
+    return Guard(m_oErr, "Item", [&] {
+        auto found = items_.Lookup(Index);
+        if (!found) StdError(m_oErr, -31627, m_sPath + "Item");
+        return found;
+    });
+}
+
+std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& SequenceName) {
+    return Guard(m_oErr, "Add", [&] {
+        auto sequence = std::make_shared<QZIviFgenSequence>();
+        sequence->Attach(m_oErr, PropSet());
+        sequence->InitProperties();
+        sequence->Name(SequenceName.empty() ? DefaultName() : SequenceName);
+        items_.Append(sequence);
+        if (const auto propSet = PropSet())
+            propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),
+                                            ChangeAdded, Count(), "");
+        return sequence;
+    });
+}
+
+void QZIviFgenSequences::Remove(const Variant& Index) {
+    Guard(m_oErr, "Remove", [&] {
+        const std::int32_t position = items_.RemovalPosition(Index);
+        if (position == 0) StdError(m_oErr, -31611, m_sPath + "Remove");
+        Queue(items_.At(position)->SequenceHandle());
+        items_.RemoveAt(position);
+        if (const auto propSet = PropSet())
+            propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),
+                                            ChangeRemoved, position, "");
+    });
+}
+
+std::int32_t QZIviFgenSequences::Limit(const char* operation, ViAttr attribute) {
+    return Guard(m_oErr, operation, [&] {
+        const auto propSet = PropSet();
+        return ReadInstrumentLimit(*m_oErr, (propSet ? propSet->Path() : std::string()) + operation,
+                                   attribute);
+    });
+}
+
+std::int32_t QZIviFgenSequences::GetMaxLoopCount() {
+    return Limit("GetMaxLoopCount", IVIFGEN_ATTR_MAX_LOOP_COUNT);
+}
+std::int32_t QZIviFgenSequences::GetMaxNumSequences() {
+    return Limit("GetMaxNumSequences", IVIFGEN_ATTR_MAX_NUM_SEQUENCES);
+}
+std::int32_t QZIviFgenSequences::GetMaxSequenceLength() {
+    return Limit("GetMaxSequenceLength", IVIFGEN_ATTR_MAX_SEQUENCE_LENGTH);
+}
+std::int32_t QZIviFgenSequences::GetMinSequenceLength() {
+    return Limit("GetMinSequenceLength", IVIFGEN_ATTR_MIN_SEQUENCE_LENGTH);
+}
+
+void QZIviFgenSequences::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                                const std::shared_ptr<CIviFgenPropImp>& propSet) {
+    m_oErr = std::move(errorReport);
+    m_oPropSet = propSet;
+    for (const auto& sequence : items_)
+        sequence->Attach(m_oErr, propSet);
+}
+
+void QZIviFgenSequences::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, "Sequences");
+    for (const auto& sequence : items_)
+        sequence->SetPath(m_sPath);
+}
+
+void QZIviFgenSequences::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "Sequences");
+    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
+    if (count <= 0) return;
+    CheckItemCount(count, bag.Size(), p + "ItemCount");
+    items_.Clear();
+    for (std::int32_t i = 1; i <= count; ++i) {
+        auto sequence = std::make_shared<QZIviFgenSequence>();
+        sequence->Attach(m_oErr, PropSet());
+        sequence->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
+        items_.Append(std::move(sequence));
+    }
+}
+
+void QZIviFgenSequences::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
+    const std::string p = BagPrefix(prefix, "Sequences");
+    bag.WriteInt32(p + "ItemCount", Count(), 0);
+    std::int32_t i = 0;
+    for (const auto& sequence : items_)
+        sequence->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
+}
+
+void QZIviFgenSequences::Clone(QZIviFgenSequences& target) const {
+    for (const auto& sequence : items_) {
+        target.Add(sequence->Name());
+        if (const auto copy = target.Item(sequence->Name())) sequence->Clone(*copy);
+    }
+}
+
+} // namespace qzivi

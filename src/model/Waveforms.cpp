@@ -1,0 +1,380 @@
+#include "qzivi/model/Waveforms.h"
+
+#include "qzivi/model/CDblArrayFromFile.h"
+#include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/model/PropertyBag.h"
+#include "qzivi/model/Sequences.h"
+#include "qzivi/support/failure.h"
+#include "qzivi/support/wait_cursor.h"
+
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+
+namespace qzivi {
+
+namespace {
+
+// Floating division that fails where the system's first language failed: x / 0 and 0 / 0.
+double Divide(double a, double b) {
+    if (b == 0) {
+        if (a == 0) RaiseRuntime(runtime::kOverflow, "Overflow.");
+        RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
+    }
+    return a / b;
+}
+
+constexpr const char* kCollection = "QZIviFgenArbWaveforms";
+
+} // namespace
+
+void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key) {
+    // An item with every value at its default stores nothing, so a count may exceed the values,
+    // but not by this much.
+    constexpr std::size_t kSlack = 1000000;
+    if (count > 0 && static_cast<std::size_t>(count) > entries + kSlack)
+        RaiseRuntime(runtime::kImproperFile, "The property bag claims " + std::to_string(count) +
+                                                 " items under \"" + key + "\" but holds only " +
+                                                 std::to_string(entries) + " values.");
+}
+
+std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source,
+                                 ViAttr attribute) {
+    const std::int32_t saved = err.state();
+    std::int32_t value = 0;
+    try {
+        std::int32_t present = 0;
+        err.CheckForValidState(IviStateClosed | IviStateBusy, source, true, present);
+        if (saved > 0) {
+            const ViStatus status =
+                IviFgen_GetAttributeViInt32(err.hSession(), "", attribute, &value);
+            err.IviCheckError(status, source, 0, "");
+        }
+    } catch (...) {
+        err.state(saved);
+        ReRaise();
+    }
+    err.state(saved);
+    return value;
+}
+
+// ---- QZIviFgenArbWaveform
+// ------------------------------------------------------------------------
+
+void QZIviFgenArbWaveform::Name(const std::string& value) {
+    const std::string old = m_sName;
+    m_sName = value;
+    if (const auto propSet = PropSet())
+        propSet->RaiseCollectionChanged(kCollection, Variant::Object(propSet->Waveforms()),
+                                        ChangeRenamed, value, old);
+}
+
+void QZIviFgenArbWaveform::Filename(const std::string& value) {
+    if (value != m_sFilename) m_bDataGotOnce = false;
+    m_sFilename = value;
+}
+
+Points QZIviFgenArbWaveform::ReadData() {
+    Points result;
+    const bool fromFile = m_lSource > 0 || !m_bDataGotOnce;
+    try {
+        if (fromFile) result = GetDataSample(0, 1, -1);
+    } catch (...) {
+        m_lDataSize = 0;
+        StdError(m_oErr, -31613, m_sName);
+    }
+    if (fromFile) {
+        if (!result)
+            RaiseRuntime(runtime::kWrongType, "Type mismatch: the file gave no array of points.");
+        m_aData = result;
+        if (m_lSource == 0) m_bDataGotOnce = true;
+    } else {
+        result = m_aData;
+    }
+    if (!result) {
+        m_lDataSize = 0;
+        StdError(m_oErr, -31613, m_sName);
+    }
+    m_lDataSize = static_cast<std::int32_t>(result->size());
+    return result;
+}
+
+Points QZIviFgenArbWaveform::Data() {
+    return Guard(m_oErr, "Data", [&] { return ReadData(); });
+}
+
+void QZIviFgenArbWaveform::Data(std::vector<double> points) {
+    const auto count = static_cast<std::int32_t>(points.size());
+    if (!points.empty() && m_lSource == 0) {
+        m_aData = std::make_shared<const std::vector<double>>(std::move(points));
+        m_bDataGotOnce = true;
+    }
+    m_lDataSize = count;
+}
+
+bool QZIviFgenArbWaveform::ForceReload() {
+    const bool had = m_lWaveformHandle != 0;
+    m_lWaveformHandle = 0;
+    return had;
+}
+
+Points QZIviFgenArbWaveform::GetDataSample(std::int32_t StartIndex, std::int32_t Interval,
+                                           std::int32_t Count) {
+    return Guard(m_oErr, "GetDataSample", [&]() -> Points {
+        const WaitCursor wait;
+        std::error_code error;
+        if (m_sFilename.empty() || !std::filesystem::exists(m_sFilename, error))
+            StdError(m_oErr, -31613, m_sName);
+        std::vector<double> points =
+            CDblArrayFromFile().RetrieveDblArray(m_lSource > 0 ? m_lSource : m_lPersistedWfmSource,
+                                                 m_sFilename, StartIndex, Interval, Count);
+        if (points.size() <= 1) return nullptr;
+        Normalize(points);
+        return std::make_shared<const std::vector<double>>(std::move(points));
+    });
+}
+
+std::int32_t QZIviFgenArbWaveform::DataSize() {
+    return Guard(m_oErr, "DataSize", [&] {
+        if (!m_bDataGotOnce) Data();
+        return m_lDataSize;
+    });
+}
+
+void QZIviFgenArbWaveform::Normalize(std::vector<double>& points) const {
+    if (m_lAutoNormalizeMode == qzivifgenNoAutoNormalize) return;
+    double high = 0.0, low = 0.0;
+    for (double p : points) {
+        if (p > high) high = p;
+        if (p < low) low = p;
+    }
+    const double peak = std::max(std::fabs(high), std::fabs(low));
+    if (m_lAutoNormalizeMode == qzivifgenNormalize) {
+        if (peak == 1.0) return;
+        for (double& p : points)
+            p = Divide(p, peak);
+    } else {
+        const double offset = (high + low) / 2;
+        const double scale = peak - offset;
+        for (double& p : points)
+            p = Divide(p - offset, scale);
+    }
+}
+
+void QZIviFgenArbWaveform::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                                  const std::shared_ptr<CIviFgenPropImp>& propSet) {
+    m_oErr = std::move(errorReport);
+    m_oPropSet = propSet;
+}
+
+void QZIviFgenArbWaveform::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, "Item(\"" + m_sName + "\")");
+}
+
+void QZIviFgenArbWaveform::PersistedWfmSource(const std::string& value) {
+    m_lPersistedWfmSource = Variant(value).AsInt32();
+}
+
+void QZIviFgenArbWaveform::InitProperties() {
+    Name("");
+    m_lWaveformHandle = 0;
+    Source(qzivifgenASCIIFile);
+    Data(std::vector<double>());
+    Filename("");
+    AutoNormalizeMode(qzivifgenNormalize);
+    m_lPersistedWfmSource = 1;
+    m_bDataGotOnce = false;
+    m_aData = nullptr;
+    m_sUniqueId = NewUniqueId();
+}
+
+void QZIviFgenArbWaveform::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "Waveform");
+    Name(bag.ReadText(p + "Name", ""));
+    Source(bag.ReadInt32(p + "Source", 1));
+    Filename(bag.ReadText(p + "Filename", ""));
+    AutoNormalizeMode(bag.ReadInt32(p + "AutoNormalizeMode", 1));
+    PersistedWfmSource(bag.ReadText(p + "PersistedWfmSource", "1"));
+    DataGotOnce(bag.ReadBool(p + "DataGotOnce", false));
+    m_sUniqueId = NewUniqueId();
+    if (m_lSource != 0) return;
+    const std::int32_t byteSize = bag.ReadInt32(p + "ByteSize", 0);
+    if (byteSize <= 0) return;
+    const Bytes bytes = bag.ReadBytes(p + "Data");
+    if (bytes.size() < static_cast<std::size_t>(byteSize))
+        RaiseRuntime(runtime::kImproperFile, "The waveform \"" + m_sName + "\" claims " +
+                                                 std::to_string(byteSize) +
+                                                 " bytes of points but the bag holds " +
+                                                 std::to_string(bytes.size()) + ".");
+    std::vector<double> points(static_cast<std::size_t>(byteSize) / sizeof(double));
+    std::memcpy(points.data(), bytes.data(), points.size() * sizeof(double));
+    Data(std::move(points));
+}
+
+void QZIviFgenArbWaveform::WriteProperties(PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "Waveform");
+    bag.WriteText(p + "Name", m_sName, "");
+    bag.WriteInt32(p + "Source", m_lSource, 1);
+    bag.WriteText(p + "Filename", m_sFilename, "");
+    bag.WriteInt32(p + "AutoNormalizeMode", m_lAutoNormalizeMode, 1);
+    bag.WriteText(p + "PersistedWfmSource", PersistedWfmSource(), "1");
+    bag.WriteBool(p + "DataGotOnce", m_bDataGotOnce, false);
+    if (m_lSource != 0) return;
+    const Points points = Data();
+    if (!points || points->empty()) {
+        bag.WriteInt32(p + "ByteSize", 0, 0);
+        return;
+    }
+    const std::size_t size = points->size() * sizeof(double);
+    bag.WriteInt32(p + "ByteSize", static_cast<std::int32_t>(size), 0);
+    Bytes bytes(size);
+    std::memcpy(bytes.data(), points->data(), size);
+    bag.WriteBytes(p + "Data", std::move(bytes));
+}
+
+void QZIviFgenArbWaveform::Clone(QZIviFgenArbWaveform& target) {
+    target.Name(m_sName);
+    target.SetWaveformHandle(m_lWaveformHandle);
+    target.Source(m_lSource);
+    target.DataGotOnce(m_bDataGotOnce);
+    target.Filename(m_sFilename);
+    if (m_lSource == 0) {
+        const Points points = Data();
+        target.Data(points ? *points : std::vector<double>());
+    }
+    target.AutoNormalizeMode(m_lAutoNormalizeMode);
+    target.PersistedWfmSource(PersistedWfmSource());
+    target.UniqueId(m_sUniqueId);
+}
+
+// ---- Queue of deleted handles ------------------------------------------------------------------
+
+void DeletedHandleQueue::RemoveDeletedHandleAt(std::int32_t i) {
+    handles_.at(static_cast<std::size_t>(i - 1)) = handles_.back();
+    handles_.pop_back();
+    if (handles_.empty()) handles_ = std::vector<std::int32_t>();
+}
+
+// ---- QZIviFgenArbWaveforms ---------------------------------------------------------------------
+
+std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Item(const Variant& Index) {
+    return Guard(m_oErr, "Item", [&] {
+        auto found = items_.Lookup(Index);
+        if (!found) StdError(m_oErr, -31625, m_sPath + "Item");
+        return found;
+    });
+}
+
+std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::string& WaveformName,
+                                                                 const Variant& Source,
+                                                                 const std::string& Filename,
+                                                                 const Variant& AutoNormalizeMode) {
+    return Guard(m_oErr, "Add", [&] {
+        auto waveform = std::make_shared<QZIviFgenArbWaveform>();
+        waveform->Attach(m_oErr, PropSet());
+        waveform->InitProperties();
+        waveform->Name(WaveformName.empty() ? DefaultName() : WaveformName);
+        waveform->Source(Source.IsMissing() ? 0 : Source.AsInt32());
+        waveform->Filename(Filename);
+        if (!AutoNormalizeMode.IsMissing())
+            waveform->AutoNormalizeMode(AutoNormalizeMode.AsInt32());
+        items_.Append(waveform);
+        if (const auto propSet = PropSet())
+            propSet->RaiseCollectionChanged(kCollection, Variant::Object(shared_from_this()),
+                                            ChangeAdded, Count(), "");
+        return waveform;
+    });
+}
+
+void QZIviFgenArbWaveforms::Remove(const Variant& Index) {
+    Guard(m_oErr, "Remove", [&] {
+        const std::int32_t position = items_.RemovalPosition(Index);
+        if (position == 0) StdError(m_oErr, -31611, m_sPath + "Remove");
+        const auto waveform = items_.At(position);
+        Queue(waveform->WaveformHandle());
+        const auto propSet = PropSet();
+        if (propSet && propSet->Sequences() && propSet->Sequences()->Count() > 0) {
+            const auto& sequences = *propSet->Sequences();
+            for (std::int32_t s = sequences.Count(); s >= 1; --s) {
+                const auto sequence = sequences.At(s);
+                for (std::int32_t i = sequence->Count(); i >= 1; --i) {
+                    const auto referred = sequence->At(i)->Waveform();
+                    if (!referred)
+                        RaiseRuntime(91,
+                                     "Object variable not set: a sequence item has no waveform.");
+                    if (text::EqualsNoCase(referred->Name(), waveform->Name())) sequence->Remove(i);
+                }
+            }
+        }
+        items_.RemoveAt(position);
+        if (propSet)
+            propSet->RaiseCollectionChanged(kCollection, Variant::Object(shared_from_this()),
+                                            ChangeRemoved, position, "");
+    });
+}
+
+std::int32_t QZIviFgenArbWaveforms::Limit(const char* operation, ViAttr attribute) {
+    return Guard(m_oErr, operation, [&] {
+        const auto propSet = PropSet();
+        return ReadInstrumentLimit(*m_oErr, (propSet ? propSet->Path() : std::string()) + operation,
+                                   attribute);
+    });
+}
+
+std::int32_t QZIviFgenArbWaveforms::GetMaxNumWaveforms() {
+    return Limit("GetMaxNumWaveforms", IVIFGEN_ATTR_MAX_NUM_WAVEFORMS);
+}
+std::int32_t QZIviFgenArbWaveforms::GetMaxWaveformSize() {
+    return Limit("GetMaxWaveformSize", IVIFGEN_ATTR_MAX_WAVEFORM_SIZE);
+}
+std::int32_t QZIviFgenArbWaveforms::GetMinWaveformSize() {
+    return Limit("GetMinWaveformSize", IVIFGEN_ATTR_MIN_WAVEFORM_SIZE);
+}
+std::int32_t QZIviFgenArbWaveforms::GetWaveformQuantum() {
+    return Limit("GetWaveformQuantum", IVIFGEN_ATTR_WAVEFORM_QUANTUM);
+}
+
+void QZIviFgenArbWaveforms::Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                                   const std::shared_ptr<CIviFgenPropImp>& propSet) {
+    m_oErr = std::move(errorReport);
+    m_oPropSet = propSet;
+    for (const auto& waveform : items_)
+        waveform->Attach(m_oErr, propSet);
+}
+
+void QZIviFgenArbWaveforms::SetPath(const std::string& parentPath) {
+    m_sPath = JoinPath(parentPath, "Waveforms");
+    for (const auto& waveform : items_)
+        waveform->SetPath(m_sPath);
+}
+
+void QZIviFgenArbWaveforms::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
+    const std::string p = BagPrefix(prefix, "Waveforms");
+    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
+    if (count <= 0) return;
+    CheckItemCount(count, bag.Size(), p + "ItemCount");
+    items_.Clear();
+    for (std::int32_t i = 1; i <= count; ++i) {
+        auto waveform = std::make_shared<QZIviFgenArbWaveform>();
+        waveform->Attach(m_oErr, PropSet());
+        waveform->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
+        items_.Append(std::move(waveform));
+    }
+}
+
+void QZIviFgenArbWaveforms::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
+    const std::string p = BagPrefix(prefix, "Waveforms");
+    bag.WriteInt32(p + "ItemCount", Count(), 0);
+    std::int32_t i = 0;
+    for (const auto& waveform : items_)
+        waveform->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
+}
+
+void QZIviFgenArbWaveforms::Clone(QZIviFgenArbWaveforms& target) const {
+    for (const auto& waveform : items_) {
+        target.Add(waveform->Name());
+        if (const auto copy = target.Item(waveform->Name())) waveform->Clone(*copy);
+    }
+}
+
+} // namespace qzivi

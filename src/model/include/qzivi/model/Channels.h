@@ -1,0 +1,194 @@
+// Output channels: what the application wants of each, and the collection that decides which one
+// the front panels show.
+#pragma once
+
+#include "qzivi/model/ModelSupport.h"
+#include "qzivi/support/event.h"
+
+#include <cstdint>
+#include <memory>
+#include <string>
+
+namespace qzivi {
+
+class CIviFgenPropImp;
+class PropertyBag;
+class QZIviFgenArbWaveform;
+class QZIviFgenSequence;
+
+enum QZIviFgenAMSources : std::int32_t { qzivifgenAMInternal = 0, qzivifgenAMExternal = 1 };
+enum QZIviFgenFMSources : std::int32_t { qzivifgenFMInternal = 0, qzivifgenFMExternal = 1 };
+enum QZIviFgenFuncWaveforms : std::int32_t {
+    qzivifgenWaveformSine = 1,
+    qzivifgenWaveformSquare = 2,
+    qzivifgenWaveformTriangle = 3,
+    qzivifgenWaveformRampUp = 4,
+    qzivifgenWaveformRampDown = 5,
+    qzivifgenWaveformDC = 6,
+};
+enum QZIviFgenOperationModes : std::int32_t {
+    qzivifgenOperateContinuous = 0,
+    qzivifgenOperateBurst = 1
+};
+enum QZIviFgenTriggerSources : std::int32_t {
+    qzivifgenExternalTrigger = 1,
+    qzivifgenSoftwareTrigger = 2,
+    qzivifgenInternalTrigger = 3,
+    qzivifgenTTL0 = 111,
+    qzivifgenTTL1 = 112,
+    qzivifgenTTL2 = 113,
+    qzivifgenTTL3 = 114,
+    qzivifgenTTL4 = 115,
+    qzivifgenTTL5 = 116,
+    qzivifgenTTL6 = 117,
+    qzivifgenTTL7 = 118,
+    qzivifgenECL0 = 119,
+    qzivifgenECL1 = 120,
+    qzivifgenPXIStar = 131,
+    qzivifgenRTSI0 = 141,
+    qzivifgenRTSI1 = 142,
+    qzivifgenRTSI2 = 143,
+    qzivifgenRTSI3 = 144,
+    qzivifgenRTSI4 = 145,
+    qzivifgenRTSI5 = 146,
+    qzivifgenRTSI6 = 147,
+};
+
+// A pure state holder: values are stored as given; the instrument judges them at Configure.
+class QZIviFgenChannel {
+public:
+    // ---- Public ----
+    const std::string& Name() const { return m_sName; }
+    void Name(const std::string& value);
+    bool AMEnabled() const { return m_bAMEnabled; }
+    void AMEnabled(bool value) { m_bAMEnabled = value; }
+    std::int32_t AMSource() const { return m_lAMSource; }
+    void AMSource(std::int32_t value) { m_lAMSource = value; }
+    double ArbFrequency() const { return m_dArbFrequency; }
+    void ArbFrequency(double value) { m_dArbFrequency = value; }
+    double ArbGain() const { return m_dArbGain; }
+    void ArbGain(double value) { m_dArbGain = value; }
+    double ArbOffset() const { return m_dArbOffset; }
+    void ArbOffset(double value) { m_dArbOffset = value; }
+    const std::shared_ptr<QZIviFgenArbWaveform>& ArbWaveform() const { return m_oArbWaveform; }
+    // Checked before it is stored: a foreign waveform (-31618) leaves the old one.
+    void ArbWaveform(const std::shared_ptr<QZIviFgenArbWaveform>& value);
+    std::int32_t BurstCount() const { return m_lBurstCount; }
+    void BurstCount(std::int32_t value) { m_lBurstCount = value; }
+    bool FMEnabled() const { return m_bFMEnabled; }
+    void FMEnabled(bool value) { m_bFMEnabled = value; }
+    std::int32_t FMSource() const { return m_lFMSource; }
+    void FMSource(std::int32_t value) { m_lFMSource = value; }
+    double FuncAmplitude() const { return m_dFuncAmplitude; }
+    void FuncAmplitude(double value) { m_dFuncAmplitude = value; }
+    double FuncDCOffset() const { return m_dFuncDCOffset; }
+    void FuncDCOffset(double value) { m_dFuncDCOffset = value; }
+    double FuncDutyCycleHigh() const { return m_dFuncDutyCycleHigh; }
+    void FuncDutyCycleHigh(double value) { m_dFuncDutyCycleHigh = value; }
+    double FuncFrequency() const { return m_dFuncFrequency; }
+    void FuncFrequency(double value) { m_dFuncFrequency = value; }
+    double FuncStartPhase() const { return m_dFuncStartPhase; }
+    void FuncStartPhase(double value) { m_dFuncStartPhase = value; }
+    std::int32_t FuncWaveform() const { return m_lFuncWaveform; }
+    void FuncWaveform(std::int32_t value) { m_lFuncWaveform = value; }
+    std::int32_t OperationMode() const { return m_lOperationMode; }
+    void OperationMode(std::int32_t value) { m_lOperationMode = value; }
+    bool OutputEnabled() const { return m_bOutputEnabled; }
+    void OutputEnabled(bool value) { m_bOutputEnabled = value; }
+    double OutputImpedance() const { return m_dOutputImpedance; }
+    void OutputImpedance(double value) { m_dOutputImpedance = value; }
+    const std::shared_ptr<QZIviFgenSequence>& Sequence() const { return m_oSequence; }
+    // Stored before it is checked: a foreign sequence (-31618) stays stored.
+    void Sequence(const std::shared_ptr<QZIviFgenSequence>& value);
+    std::int32_t TriggerSource() const { return m_lTriggerSource; }
+    void TriggerSource(std::int32_t value) { m_lTriggerSource = value; }
+
+    // ---- Internal ----
+    // Also follows CollectionChanged of `propSet`.
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                const std::shared_ptr<CIviFgenPropImp>& propSet);
+    const std::string& Path() const { return m_sPath; }
+    void SetPath(const std::string& parentPath);
+    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
+    void InitProperties();
+    void ReadProperties(const PropertyBag& bag, const std::string& prefix);
+    void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
+    void Clone(QZIviFgenChannel& target) const;
+    const std::string& UniqueId() const { return m_sUniqueId; }
+    void UniqueId(const std::string& value) { m_sUniqueId = value; }
+
+private:
+    void OnCollectionChanged(const std::string& name, std::int32_t kind);
+
+    std::string m_sName;
+    bool m_bAMEnabled = false;
+    std::int32_t m_lAMSource = 0;
+    double m_dArbFrequency = 1000;
+    double m_dArbGain = 1;
+    double m_dArbOffset = 0;
+    std::shared_ptr<QZIviFgenArbWaveform> m_oArbWaveform;
+    std::int32_t m_lBurstCount = 2;
+    bool m_bFMEnabled = false;
+    std::int32_t m_lFMSource = 0;
+    double m_dFuncAmplitude = 2;
+    double m_dFuncDCOffset = 0;
+    double m_dFuncDutyCycleHigh = 50;
+    double m_dFuncFrequency = 1000;
+    double m_dFuncStartPhase = 0;
+    std::int32_t m_lFuncWaveform = qzivifgenWaveformSine;
+    std::int32_t m_lOperationMode = qzivifgenOperateContinuous;
+    bool m_bOutputEnabled = true;
+    double m_dOutputImpedance = 50;
+    std::shared_ptr<QZIviFgenSequence> m_oSequence;
+    std::int32_t m_lTriggerSource = qzivifgenExternalTrigger;
+    std::shared_ptr<CIviErrorReport> m_oErr;
+    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
+    std::string m_sPath;
+    std::string m_sUniqueId;
+    Connection m_cCollectionChanged;
+};
+
+class QZIviFgenChannels : public std::enable_shared_from_this<QZIviFgenChannels> {
+public:
+    // ---- Public ----
+    auto begin() const { return items_.begin(); }
+    auto end() const { return items_.end(); }
+    std::shared_ptr<QZIviFgenChannel> Item(const Variant& Index);
+    std::int32_t Count() const { return items_.Count(); }
+    std::shared_ptr<QZIviFgenChannel> Add(const std::string& ChannelName = "");
+    void Remove(const Variant& Index);
+    // With none active and channels present, the first becomes active, without an event.
+    std::shared_ptr<QZIviFgenChannel> ActiveChannel();
+    void ActiveChannel(const std::shared_ptr<QZIviFgenChannel>& value);
+
+    // ---- Internal ----
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                const std::shared_ptr<CIviFgenPropImp>& propSet);
+    const std::string& Path() const { return m_sPath; }
+    void SetPath(const std::string& parentPath);
+    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
+    void InitProperties() { items_.Clear(); }
+    void ReadProperties(const PropertyBag& bag, const std::string& prefix);
+    void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
+    void Clone(QZIviFgenChannels& target) const;
+    bool ContainsObject(const QZIviFgenChannel& object) const {
+        return items_.ContainsUniqueId(object.UniqueId());
+    }
+    std::int32_t IndexOfObject(const QZIviFgenChannel* object) const {
+        return items_.IndexOfObject(object);
+    }
+    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+    std::string DefaultName() const { return items_.DefaultName("Channel"); }
+    const std::shared_ptr<QZIviFgenChannel>& At(std::int32_t position) const {
+        return items_.At(position);
+    }
+
+private:
+    ItemList<QZIviFgenChannel> items_;
+    std::shared_ptr<QZIviFgenChannel> m_oActiveChannel;
+    std::shared_ptr<CIviErrorReport> m_oErr;
+    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
+    std::string m_sPath;
+};
+
+} // namespace qzivi
