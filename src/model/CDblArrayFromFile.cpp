@@ -7,6 +7,7 @@
 #include <cerrno>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
 #include <optional>
@@ -32,7 +33,7 @@ constexpr std::size_t kReadSize = 1 << 20;
     RaiseRuntime(-runtime::kTooFewData,
                  "The number of points requested exceeds the amount of available data.");
 }
-[[noreturn]] void OutOfRange() {
+[[noreturn]] void CutFails() {
     RaiseRuntime(runtime::kIndexOutOfRange, "Subscript out of range.");
 }
 
@@ -92,19 +93,21 @@ bool ParseToken(const char* p, const char* end, double& value) {
         ++p;
     }
     if (p == end || !(IsDigit(*p) || *p == '.')) return false;
-    const auto [q, error] = std::from_chars(p, end, value);
-    if (error != std::errc()) return false;
+    auto [q, error] = std::from_chars(p, end, value);
+    if (error == std::errc::result_out_of_range) {
+        // Too large is no number; too small is zero, as strtod has it.
+        const std::string copy(p, static_cast<std::size_t>(q - p));
+        value = std::strtod(copy.c_str(), nullptr);
+        if (!std::isfinite(value)) return false;
+    } else if (error != std::errc()) {
+        return false;
+    }
     const char* rest = q;
     while (rest < end && IsSpace(*rest))
         ++rest;
     if (rest != end && *rest != '\0') return false;
     if (negative) value = -value;
     return true;
-}
-
-// VB's rounding of a Double to an integer: halves to the even neighbour.
-std::int64_t RoundHalfEven(double x) {
-    return static_cast<std::int64_t>(std::nearbyint(x));
 }
 
 // Integer division as the system's first language did it: towards zero; by zero it fails.
@@ -176,6 +179,21 @@ void ForEachToken(const char* begin, const char* end, char delimiter, Take&& tak
     }
 }
 
+// Takes every `interval`-th token of [begin, end) from token `wanted` on, while fewer than `limit`
+// points are held: the stepping loop of both paths.
+void TakeTokens(const char* begin, const char* end, char delimiter, std::int64_t wanted,
+                std::int32_t interval, std::uint64_t limit, std::vector<double>& result) {
+    ForEachToken(begin, end, delimiter, [&](std::int64_t index, const char* a, const char* b) {
+        if (result.size() >= limit) return false;
+        if (index == wanted) {
+            double value = 0;
+            if (ParseToken(a, b, value)) result.push_back(value);
+            wanted += interval;
+        }
+        return true;
+    });
+}
+
 // Nothing for no data; an empty array when no token converted, where the cut of the array fails.
 std::optional<std::vector<double>> SmallFile(const std::string& block, std::size_t firstDigit,
                                              char delimiter, std::int32_t startIndex,
@@ -183,30 +201,16 @@ std::optional<std::vector<double>> SmallFile(const std::string& block, std::size
     const char* begin = block.data() + firstDigit;
     const char* end = block.data() + block.size();
     const auto tokens = static_cast<std::int64_t>(std::count(begin, end, delimiter)) + 1;
-    if (interval == 0) RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
-    const double available =
-        static_cast<double>(tokens) / interval - static_cast<double>(startIndex) / interval;
-    const std::int64_t limit = count == -1 ? RoundHalfEven(available) : count;
+    // The tokens the step reaches: "0,1,2,3,4,5" from 1 by 2 gives 1, 3 and 5.
+    const std::int64_t available =
+        tokens > startIndex ? (tokens - startIndex + interval - 1) / interval : 0;
+    const std::int64_t limit = count == -1 ? available : count;
     if (limit <= 0) return std::nullopt;
-    if (count != -1 && static_cast<double>(limit) > available) TooFewData();
-
-    // Tokens by position, for a step that may go backwards.
-    std::vector<std::pair<const char*, const char*>> spans;
-    spans.reserve(static_cast<std::size_t>(tokens));
-    ForEachToken(begin, end, delimiter, [&](std::int64_t, const char* a, const char* b) {
-        spans.emplace_back(a, b);
-        return true;
-    });
+    if (count != -1 && limit > available) TooFewData();
     std::vector<double> result;
-    result.reserve(static_cast<std::size_t>(std::min<std::int64_t>(limit, tokens)));
-    for (std::int64_t i = startIndex;
-         i <= tokens - 1 && static_cast<std::int64_t>(result.size()) < limit; i += interval) {
-        if (i < 0) OutOfRange();
-        double value = 0;
-        if (ParseToken(spans[static_cast<std::size_t>(i)].first,
-                       spans[static_cast<std::size_t>(i)].second, value))
-            result.push_back(value);
-    }
+    result.reserve(static_cast<std::size_t>(std::min(limit, tokens)));
+    TakeTokens(begin, end, delimiter, startIndex, interval, static_cast<std::uint64_t>(limit),
+               result);
     return result;
 }
 
@@ -227,8 +231,6 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
     std::uint64_t textStart = 0, blockEnd = CDblArrayFromFile::kBlockSize;
     std::size_t skip = firstDigit;
     bool first = true;
-    // A step of 0 or less, or a start before the first token, reads nothing here either.
-    if (interval <= 0 || startIndex < 0) return {};
     for (;;) {
         const std::uint64_t realEnd = std::min(blockEnd, length);
         if (realEnd > bufferEnd) {
@@ -282,13 +284,15 @@ std::vector<double> ReadText(const std::string& filename, std::int32_t startInde
         const std::string delimiter = CDblArrayFromFile::FindDelimiter(block);
         if (delimiter.empty()) ImproperFile();
         const std::size_t firstDigit = block.find_first_of("0123456789");
+        // A step of 0 or below, or a start before the first token, reads nothing on either path.
+        if (interval <= 0 || startIndex < 0) return {};
         if (file.Size() > CDblArrayFromFile::kBlockSize)
             return BlockPath(file, firstDigit, delimiter[0], startIndex, interval, count);
         small = SmallFile(block, firstDigit, delimiter[0], startIndex, interval, count);
     } catch (...) {
         return {};
     }
-    if (small && small->empty()) OutOfRange(); // the cut of the array to no element
+    if (small && small->empty()) CutFails(); // the cut of the array to no element
     return small ? std::move(*small) : std::vector<double>();
 }
 

@@ -1,0 +1,298 @@
+// Waveform data files: the three formats, the text reader's rules and quirks, and a comparison
+// with a literal model of those rules over many generated files.
+#include "qzivi/model/CDblArrayFromFile.h"
+#include "qzivi/support/failure.h"
+
+#include <gtest/gtest.h>
+
+#include <cmath>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <optional>
+#include <random>
+#include <unistd.h>
+
+namespace qzivi {
+namespace {
+
+namespace fs = std::filesystem;
+
+class DataFileTest : public ::testing::Test {
+protected:
+    DataFileTest() {
+        dir_ = fs::temp_directory_path() / ("qzivi-data-" + std::to_string(::getpid()));
+        fs::create_directories(dir_);
+    }
+    ~DataFileTest() override { fs::remove_all(dir_); }
+
+    std::string Write(const std::string& bytes, const std::string& name = "data.txt") {
+        const auto path = (dir_ / name).string();
+        std::ofstream(path, std::ios::binary) << bytes;
+        return path;
+    }
+    template <typename Int>
+    std::string WriteInts(const std::vector<Int>& values) {
+        return Write(
+            std::string(reinterpret_cast<const char*>(values.data()), values.size() * sizeof(Int)),
+            "data.bin");
+    }
+    std::vector<double> Text(const std::string& bytes, std::int32_t start = 0,
+                             std::int32_t interval = 1, std::int32_t count = -1) {
+        return reader_.RetrieveDblArray(DataFileASCII, Write(bytes), start, interval, count);
+    }
+    static std::string Repeat(const std::string& piece, int times) {
+        std::string s;
+        for (int i = 0; i < times; ++i)
+            s += piece;
+        return s;
+    }
+
+    fs::path dir_;
+    CDblArrayFromFile reader_;
+};
+
+using V = std::vector<double>;
+
+TEST_F(DataFileTest, TextSplitsAtTheDelimiterFoundAfterTheFirstDigit) {
+    EXPECT_EQ(Text("0,1,2,3,4,5", 1, 2), (V{1, 3, 5}));
+    EXPECT_EQ(Text("1,x,3"), (V{1, 3})) << "a token that is no number takes no place";
+    EXPECT_EQ(Text("1.5\r\n-2\r\n3e2\r\n"), (V{1.5, -2, 300}))
+        << "carriage return, then tokens with a line feed";
+    EXPECT_EQ(Text("Volts\n0.25 0.5 +1"), (V{0.25, 0.5, 1}))
+        << "a header before the first digit is skipped";
+    EXPECT_EQ(Text("1;2,3,4"), (V{1})) << "the semicolon comes first in the order of delimiters";
+    EXPECT_EQ(Text(" 1 , 2 ,\t3"), (V{1, 2, 3}));
+}
+
+TEST_F(DataFileTest, TextQuirksStayAsTheyAre) {
+    EXPECT_EQ(Text("-1.5,2"), (V{1.5, 2})) << "the first number loses its sign";
+    EXPECT_EQ(Text(".5,2"), (V{5, 2})) << "and its leading point";
+    EXPECT_TRUE(Text("1.5").empty()) << "no delimiter, no data";
+    EXPECT_EQ(Text("1.5,"), (V{1.5})) << "a delimiter: the tokens 1.5 and one without a number";
+    EXPECT_TRUE(Text("").empty());
+    EXPECT_TRUE(Text("no digits at all, none").empty());
+    EXPECT_EQ(Text("1,2,3,"), (V{1, 2, 3})) << "a trailing delimiter's empty token gives nothing";
+    EXPECT_EQ(Text("1,2,3", 0, 1, 3), (V{1, 2, 3}));
+    EXPECT_TRUE(Text("1,2,3", 0, 1, 4).empty()) << "one more than there are: no data";
+    EXPECT_TRUE(Text("1,2,3", 0, 0).empty()) << "a step of 0";
+    EXPECT_TRUE(Text("1,2,3", 5).empty()) << "a start past the end";
+    EXPECT_EQ(Text("1,2,3,4,5,6", 0, 4), (V{1, 5})) << "tokens 0 and 4";
+    EXPECT_EQ(Text("0,1,2,3,4,5", 1, 2, 3), (V{1, 3, 5})) << "three points are there to take";
+    EXPECT_EQ(Text("1,inf,nan,0x10,2"), (V{1, 2})) << "only plain decimal numbers";
+}
+
+TEST_F(DataFileTest, ASmallFileWithADelimiterButNoNumberFails) {
+    try {
+        Text("1x,y");
+        FAIL() << "the cut to no element must fail";
+    } catch (const Failure& f) {
+        EXPECT_EQ(f.Number(), runtime::kIndexOutOfRange);
+    }
+}
+
+TEST_F(DataFileTest, TenThousandBytesIsSmallTenThousandAndOneIsBlocks) {
+    // 5000 tokens in the first 10000 bytes; a larger file steps anew in its next block.
+    const std::string first = "7," + Repeat("0,", 4999);
+    ASSERT_EQ(first.size(), 10000u);
+    const V small = Text(first, 0, 3);
+    EXPECT_EQ(small.size(), 1667u);
+    const V blocks = Text(first + "5,6,7,8,", 0, 3);
+    ASSERT_EQ(blocks.size(), 1669u);
+    EXPECT_EQ(blocks[0], 7);
+    EXPECT_EQ(blocks[1667], 5) << "the second block starts again at its token 0";
+    EXPECT_EQ(blocks[1668], 8);
+    EXPECT_EQ(Text(first + "5,6,7,8,", 6000), (V{5, 6, 7, 8}))
+        << "a start beyond the first block skips that block";
+    // At the end of the file the text after the last delimiter is cut away as the tail.
+    const V cut = Text(first + "5,6,7,8");
+    EXPECT_EQ(cut.back(), 7);
+    const std::string exact = Repeat("1,", 4998) + "7,89";
+    ASSERT_EQ(exact.size(), 10000u);
+    EXPECT_EQ(Text(exact).back(), 89) << "the small path keeps it";
+}
+
+TEST_F(DataFileTest, IntegerFormatsScaleAndStep) {
+    const auto path16 = WriteInts<std::int16_t>({32767, -32768, 0, 16384, 1, 2, 3, 4, 5, 6});
+    const V all = reader_.RetrieveDblArray(DataFile2ByteInteger, path16, 0, 1, -1);
+    ASSERT_EQ(all.size(), 10u);
+    EXPECT_EQ(all[0], 1.0);
+    EXPECT_EQ(all[1], -32768.0 / 32767.0) << "just below -1";
+    EXPECT_EQ(reader_.RetrieveDblArray(DataFile2ByteInteger, path16, 1, 3, -1),
+              (V{-32768.0 / 32767, 1 / 32767.0, 4 / 32767.0}));
+    EXPECT_EQ(reader_.RetrieveDblArray(DataFile2ByteInteger, path16, 2, 2, 2), (V{0, 1 / 32767.0}));
+    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile2ByteInteger, path16, 2, 2, 5).empty())
+        << "beyond the data";
+    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile2ByteInteger, path16, 0, 0, -1).empty())
+        << "a step of 0";
+    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile2ByteInteger, path16, -1, 1, 3).empty())
+        << "before the file";
+
+    const auto path32 = WriteInts<std::int32_t>({2147483647, -1073741824});
+    EXPECT_EQ(reader_.RetrieveDblArray(DataFile4ByteInteger, path32, 0, 1, -1),
+              (V{1.0, -1073741824 / 2147483647.0}));
+    EXPECT_EQ(reader_.RetrieveDblArray(DataFile2ByteInteger,
+                                       Write(std::string("\x01\x00\x02\x00\x03", 5), "odd.bin"), 0,
+                                       1, -1),
+              (V{1 / 32767.0, 2 / 32767.0}))
+        << "a rest shorter than one element is dropped";
+    EXPECT_TRUE(
+        reader_.RetrieveDblArray(DataFile4ByteInteger, Write("", "empty.bin"), 0, 1, -1).empty());
+}
+
+TEST_F(DataFileTest, BadFilesGiveNoDataAndAnUnknownTypeFails) {
+    EXPECT_TRUE(
+        reader_.RetrieveDblArray(DataFileASCII, (dir_ / "missing.txt").string(), 0, 1, -1).empty());
+    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile2ByteInteger, "", 0, 1, -1).empty());
+    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile4ByteInteger, dir_.string(), 0, 1, -1).empty())
+        << "a folder";
+    try {
+        reader_.RetrieveDblArray(4, Write("1,2"), 0, 1, -1);
+        FAIL();
+    } catch (const Failure& f) {
+        EXPECT_EQ(f.Number(), -60040);
+        EXPECT_EQ(f.Description(), "Improper file type.");
+    }
+    std::mt19937 random(11);
+    for (int round = 0; round < 30; ++round) {
+        std::string noise(static_cast<std::size_t>(random() % 30000), '\0');
+        for (char& c : noise)
+            c = static_cast<char>(random());
+        const auto path = Write(noise, "noise.bin");
+        EXPECT_EQ(reader_.RetrieveDblArray(DataFile2ByteInteger, path, 0, 1, -1).size(),
+                  noise.size() / 2);
+        EXPECT_EQ(reader_.RetrieveDblArray(DataFile4ByteInteger, path, 0, 1, -1).size(),
+                  noise.size() / 4);
+        try {
+            for (double v : reader_.RetrieveDblArray(DataFileASCII, path, 0, 1, -1))
+                EXPECT_FALSE(std::isnan(v));
+        } catch (const Failure& f) {
+            EXPECT_EQ(f.Number(), runtime::kIndexOutOfRange);
+        }
+    }
+}
+
+// ---- The literal model ------------------------------------------------------------------------
+
+// The rules of the text reader taken word for word: whole blocks of 10000 characters padded with
+// NUL, split into tokens, each token converted on its own. Slow, and independent of the reader.
+struct Literal {
+    std::optional<V> values; // nothing: no data
+    bool cutFails = false;
+};
+
+bool Convert(std::string token, double& out) {
+    token = token.substr(0, token.find('\0'));
+    const auto first = token.find_first_not_of(" \t\n\r\v\f");
+    if (first == std::string::npos) return false;
+    token = token.substr(first, token.find_last_not_of(" \t\n\r\v\f") - first + 1);
+    std::size_t at = token[0] == '+' || token[0] == '-' ? 1 : 0;
+    if (at >= token.size() ||
+        !(std::isdigit(static_cast<unsigned char>(token[at])) || token[at] == '.'))
+        return false;
+    if (token.find_first_of("xXpP") != std::string::npos) return false;
+    char* end = nullptr;
+    out = std::strtod(token.c_str(), &end);
+    return end == token.c_str() + token.size() && std::isfinite(out);
+}
+
+std::vector<std::string> Split(const std::string& text, char delimiter) {
+    std::vector<std::string> tokens(1);
+    for (char c : text) {
+        if (c == delimiter)
+            tokens.emplace_back();
+        else
+            tokens.back().push_back(c);
+    }
+    return tokens;
+}
+
+Literal LiteralRead(const std::string& file, std::int64_t start, std::int64_t interval,
+                    std::int64_t count) {
+    const std::size_t B = 10000;
+    auto block = [&](std::size_t k) {
+        std::string b = k * B < file.size() ? file.substr(k * B, B) : std::string();
+        b.resize(B, '\0');
+        return b;
+    };
+    std::string text = block(0);
+    const std::string delimiter = CDblArrayFromFile::FindDelimiter(text);
+    if (delimiter.empty()) return {};
+    const char d = delimiter[0];
+    const std::size_t firstDigit = text.find_first_of("0123456789");
+    if (interval <= 0 || start < 0) return {}; // the division, or a token before the first, fails
+    V out;
+    if (file.size() <= B) {
+        const auto tokens = Split(text.substr(firstDigit), d);
+        const auto t = std::int64_t(tokens.size());
+        const std::int64_t available = t > start ? (t - start + interval - 1) / interval : 0;
+        const std::int64_t limit = count == -1 ? available : count;
+        if (limit <= 0) return {};
+        if (count != -1 && limit > available) return {};
+        for (std::int64_t i = start;
+             i <= std::int64_t(tokens.size()) - 1 && std::int64_t(out.size()) < limit;
+             i += interval) {
+            double v;
+            if (Convert(tokens[std::size_t(i)], v)) out.push_back(v);
+        }
+        if (out.empty()) return {std::nullopt, true};
+        return {out, false};
+    }
+    const std::int64_t limit = count == -1 ? std::int64_t(file.size()) : count;
+    std::size_t skip = firstDigit;
+    for (std::size_t k = 0;; ++k) {
+        const std::size_t cut = text.rfind(d);
+        const std::string body = cut == std::string::npos ? text : text.substr(0, cut + 1);
+        const std::string tail = cut == std::string::npos ? std::string() : text.substr(cut + 1);
+        const auto tokens = Split(body.substr(skip), d);
+        for (std::int64_t i = k == 0 ? start : 0;
+             i <= std::int64_t(tokens.size()) - 1 && std::int64_t(out.size()) < limit;
+             i += interval) {
+            double v;
+            if (Convert(tokens[std::size_t(i)], v)) out.push_back(v);
+        }
+        if ((k + 1) * B >= file.size()) {
+            if (count != -1 && limit >= std::int64_t(out.size()) + 1) return {};
+            if (out.empty()) return {};
+            return {out, false};
+        }
+        text = tail + block(k + 1);
+        skip = 0;
+    }
+}
+
+TEST_F(DataFileTest, AgreesWithTheLiteralRulesOnGeneratedFiles) {
+    std::mt19937 random(2024);
+    const std::string alphabet = "0123456789012345678901234567890123456789..--+e,,,,;\r\n\n  \tx";
+    int compared = 0;
+    for (int round = 0; round < 400; ++round) {
+        const std::size_t size = random() % 3 == 0 ? 9990 + random() % 20 : random() % 32000;
+        std::string file(size, ' ');
+        for (char& c : file)
+            c = alphabet[random() % alphabet.size()];
+        if (round % 7 == 0 && !file.empty()) file[random() % file.size()] = '\0';
+        const auto path = Write(file);
+        const std::int32_t start =
+            static_cast<std::int32_t>(random() % 5 == 0 ? random() % 12000 : random() % 4);
+        const std::int32_t interval =
+            static_cast<std::int32_t>(random() % 6) - (round % 29 == 0 ? 1 : 0);
+        const std::int32_t count =
+            random() % 3 == 0 ? static_cast<std::int32_t>(random() % 3000) : -1;
+        const Literal expected = LiteralRead(file, start, interval, count);
+        SCOPED_TRACE("round " + std::to_string(round) + ", " + std::to_string(size) +
+                     " bytes, start " + std::to_string(start) + ", interval " +
+                     std::to_string(interval) + ", count " + std::to_string(count));
+        try {
+            const V got = reader_.RetrieveDblArray(DataFileASCII, path, start, interval, count);
+            ASSERT_FALSE(expected.cutFails);
+            ASSERT_EQ(got, expected.values.value_or(V{}));
+        } catch (const Failure& f) {
+            ASSERT_TRUE(expected.cutFails) << f.Description();
+        }
+        ++compared;
+    }
+    EXPECT_EQ(compared, 400);
+}
+
+} // namespace
+} // namespace qzivi
