@@ -99,6 +99,12 @@ Points QZIviFgenArbWaveform::ReadData() {
     return result;
 }
 
+Points QZIviFgenArbWaveform::StoredPoints() {
+    // With no points held and no file named there is nothing to obtain, and no failure to report.
+    if (!m_bDataGotOnce && m_sFilename.empty()) return nullptr;
+    return Data();
+}
+
 Points QZIviFgenArbWaveform::Data() {
     return Guard(m_oErr, "Data", [&] { return ReadData(); });
 }
@@ -220,7 +226,7 @@ void QZIviFgenArbWaveform::WriteProperties(PropertyBag& bag, const std::string& 
     bag.WriteText(p + "PersistedWfmSource", PersistedWfmSource(), "1");
     bag.WriteBool(p + "DataGotOnce", m_bDataGotOnce, false);
     if (m_lSource != 0) return;
-    const Points points = Data();
+    const Points points = StoredPoints();
     if (!points || points->empty()) {
         bag.WriteInt32(p + "ByteSize", 0, 0);
         return;
@@ -239,7 +245,7 @@ void QZIviFgenArbWaveform::Clone(QZIviFgenArbWaveform& target) {
     target.DataGotOnce(m_bDataGotOnce);
     target.Filename(m_sFilename);
     if (m_lSource == 0) {
-        const Points points = Data();
+        const Points points = StoredPoints();
         target.Data(points ? *points : std::vector<double>());
     }
     target.AutoNormalizeMode(m_lAutoNormalizeMode);

@@ -75,6 +75,8 @@ public:
 
 private:
     Points ReadData();
+    // The points a persisted waveform stores and copies.
+    Points StoredPoints();
 
     std::string m_sName;
     std::int32_t m_lWaveformHandle = 0;

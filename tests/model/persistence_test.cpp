@@ -1,0 +1,172 @@
+// A whole tree through the bag and through Clone: channels, waveforms of every source, sequences
+// and internal settings come back equal, with references resolved by index.
+#include "qzivi/model/PropertyBag.h"
+#include "tree_fixture.h"
+
+#include <sstream>
+
+namespace qzivi {
+namespace {
+
+// Everything a user set in a tree, as text, references by name.
+std::string Describe(CIviFgenPropImp& t) {
+    std::ostringstream o;
+    o << t.ArbSampleRate() << ' ' << t.AutoStopStart() << ' ' << t.Extensions() << ' '
+      << t.OutputMode() << ' ' << t.RefClockSource() << ' ' << t.LogicalName() << ' '
+      << t.AutoConfigure() << ' ' << t.Enabled() << ' ' << t.UIStyle() << ' '
+      << t.ExceptionOnError() << '\n';
+    const auto& in = *t.Internal();
+    o << in.AMInternalDepth() << ' ' << in.AMInternalFrequency() << ' ' << in.AMInternalWaveform()
+      << ' ' << in.FMInternalDeviation() << ' ' << in.FMInternalFrequency() << ' '
+      << in.FMInternalWaveform() << ' ' << in.InternalTriggerRate() << '\n';
+    for (const auto& c : *t.Channels())
+        o << "channel " << c->Name() << ' ' << c->AMEnabled() << ' ' << c->AMSource() << ' '
+          << c->ArbFrequency() << ' ' << c->ArbGain() << ' ' << c->ArbOffset() << ' '
+          << (c->ArbWaveform() ? c->ArbWaveform()->Name() : "-") << ' ' << c->BurstCount() << ' '
+          << c->FMEnabled() << ' ' << c->FMSource() << ' ' << c->FuncAmplitude() << ' '
+          << c->FuncDCOffset() << ' ' << c->FuncDutyCycleHigh() << ' ' << c->FuncFrequency() << ' '
+          << c->FuncStartPhase() << ' ' << c->FuncWaveform() << ' ' << c->OperationMode() << ' '
+          << c->OutputEnabled() << ' ' << c->OutputImpedance() << ' '
+          << (c->Sequence() ? c->Sequence()->Name() : "-") << ' ' << c->TriggerSource() << '\n';
+    for (const auto& w : *t.Waveforms()) {
+        o << "waveform " << w->Name() << ' ' << w->Source() << ' ' << w->Filename() << ' '
+          << w->AutoNormalizeMode() << ' ' << w->PersistedWfmSource() << ' ' << w->DataSize()
+          << ':';
+        if (const auto points = w->Data())
+            for (double p : *points)
+                o << ' ' << p;
+        o << '\n';
+    }
+    for (const auto& s : *t.Sequences()) {
+        o << "sequence " << s->Name();
+        for (const auto& item : *s)
+            o << " (" << (item->Waveform() ? item->Waveform()->Name() : "-") << " x"
+              << item->Iterations() << ')';
+        o << '\n';
+    }
+    return o.str();
+}
+
+class PersistenceTest : public test::TreeTest {
+protected:
+    void Build() {
+        tree_->ArbSampleRate(2e6);
+        tree_->Extensions(0x3FF);
+        tree_->OutputMode(2);
+        tree_->LogicalName("Bench");
+        tree_->Internal()->AMInternalDepth(75);
+        tree_->Internal()->FMInternalWaveform(3);
+        auto& w = *tree_->Waveforms();
+        const auto held = w.Add("Held");
+        held->Data({0.0, 0.5, -0.25, 1.0});
+        const auto text = w.Add("Text", qzivifgenASCIIFile, File("t.txt", "0,1,-2,4\n"),
+                                qzivifgenNormalizeAndRemoveOffset);
+        const std::int16_t shorts[] = {32767, 0, -16384};
+        w.Add("Short", qzivifgen2ByteInteger,
+              File("s.bin", std::string(reinterpret_cast<const char*>(shorts), 6)));
+        const std::int32_t longs[] = {2147483647, -1, 1 << 30};
+        w.Add("Long", qzivifgen4ByteInteger,
+              File("l.bin", std::string(reinterpret_cast<const char*>(longs), 12)),
+              qzivifgenNoAutoNormalize);
+        const auto notYet = w.Add("NotYet");
+        notYet->PersistedWfmSource("1");
+        notYet->Filename(
+            File("n.txt", "3,2,1\n")); // persisted, taken from the file at its first write
+        auto& s = *tree_->Sequences();
+        const auto s1 = s.Add("Up");
+        s1->Add(held, 3);
+        s1->Add(text, 1);
+        s.Add("Empty");
+        auto& c = *tree_->Channels();
+        const auto c1 = c.Add();
+        c1->FuncWaveform(2);
+        c1->FuncDutyCycleHigh(25);
+        c1->OutputImpedance(75);
+        c1->TriggerSource(3);
+        c1->ArbWaveform(text);
+        c1->Sequence(s1);
+        const auto c2 = c.Add("Out B");
+        c2->AMEnabled(true);
+        c2->BurstCount(7);
+        c2->ArbWaveform(held);
+    }
+};
+
+TEST_F(PersistenceTest, WriteThenReadGivesAnEqualTree) {
+    Build();
+    PropertyBag bag;
+    tree_->WriteProperties(bag, "", true);
+    EXPECT_EQ(bag.ReadInt32("Channels_Item1_Channel_ArbWaveform", 0), 2) << "by index";
+    EXPECT_EQ(bag.ReadInt32("Sequences_Item1_Sequence_Item2_SequenceItem_Waveform", 0), 2);
+    EXPECT_EQ(bag.ReadInt32("Waveforms_Item5_Waveform_ByteSize", 0), 24)
+        << "the points came from the file";
+    PropertyBag carried;
+    carried.SetContents(bag.Contents());
+    auto copy = NewTree();
+    copy->ReadProperties(carried, "", true);
+    EXPECT_EQ(Describe(*copy), Describe(*tree_));
+    // The persisted waveforms need their files no more.
+    std::filesystem::remove(dir_ / "n.txt");
+    EXPECT_EQ(copy->Waveforms()->Item("NotYet")->Data()->size(), 3u);
+}
+
+TEST_F(PersistenceTest, CloneGivesAnEqualTreeThatSharesTheReferences) {
+    Build();
+    const auto copy = tree_->Clone(nullptr);
+    EXPECT_EQ(Describe(*copy), Describe(*tree_));
+    EXPECT_EQ(copy->Channels()->Item(1)->ArbWaveform(), tree_->Waveforms()->Item("Text"))
+        << "a clone's channel refers to the very object of the source tree";
+    copy->Channels()->Item(1)->FuncFrequency(5);
+    EXPECT_EQ(tree_->Channels()->Item(1)->FuncFrequency(), 1000);
+}
+
+TEST_F(PersistenceTest, DuplicateNamesResolveToTheFirst) {
+    const auto first = tree_->Waveforms()->Add("Dup");
+    const auto second = tree_->Waveforms()->Add("Dup");
+    const auto ch = tree_->Channels()->Add();
+    ch->ArbWaveform(second);
+    PropertyBag bag;
+    tree_->WriteProperties(bag, "", true);
+    EXPECT_EQ(bag.ReadInt32("Channels_Item1_Channel_ArbWaveform", 0), 1);
+    auto copy = NewTree();
+    copy->ReadProperties(bag, "", true);
+    EXPECT_EQ(copy->Waveforms()->IndexOfObject(copy->Channels()->Item(1)->ArbWaveform().get()), 1);
+    (void)first;
+}
+
+TEST_F(PersistenceTest, AChannelWithoutWaveformStoresNoReference) {
+    tree_->Channels()->Add();
+    PropertyBag bag;
+    tree_->WriteProperties(bag, "", true);
+    EXPECT_FALSE(bag.Contains("Channels_Item1_Channel_ArbWaveform"));
+    auto copy = NewTree();
+    copy->ReadProperties(bag, "", true);
+    EXPECT_EQ(copy->Channels()->Item(1)->ArbWaveform(), nullptr);
+    EXPECT_EQ(copy->Channels()->Item(1)->Name(), "Channel1");
+}
+
+TEST_F(PersistenceTest, ANewWaveformWithoutPointsSavesQuietlyButAMissingFileReports) {
+    tree_->Waveforms()->Add("New");
+    PropertyBag bag;
+    EXPECT_EQ(Raised([&] { tree_->WriteProperties(bag, "", true); }), 0);
+    EXPECT_EQ(Raised([&] { tree_->Clone(nullptr); }), 0);
+    EXPECT_TRUE(codes_.empty()) << "nothing to obtain, nothing to report";
+    tree_->Waveforms()->Item("New")->Filename((dir_ / "gone.txt").string());
+    EXPECT_EQ(Raised([&] { tree_->WriteProperties(bag, "", true); }), -31613);
+}
+
+TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
+    PropertyBag bag;
+    bag.WriteInt32("Waveforms_ItemCount", 2000000000, 0);
+    EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(bag, "", true); }), runtime::kImproperFile);
+    PropertyBag shortPoints;
+    shortPoints.WriteInt32("Waveforms_ItemCount", 1, 0);
+    shortPoints.WriteInt32("Waveforms_Item1_Waveform_Source", 0, 1);
+    shortPoints.WriteInt32("Waveforms_Item1_Waveform_ByteSize", 800, 0);
+    shortPoints.WriteBytes("Waveforms_Item1_Waveform_Data", Bytes(16));
+    EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(shortPoints, "", true); }),
+              runtime::kImproperFile);
+}
+
+} // namespace
+} // namespace qzivi
