@@ -122,6 +122,22 @@ void QZIviFgen::CloseSession() {
     Frame("CloseSession", [&] { m_oIO->CloseSession(); });
 }
 
+void QZIviFgen::Configure() {
+    Frame("Configure", [&] { m_oIO->Configure(false); });
+}
+
+void QZIviFgen::Initiate() {
+    Frame("Initiate", [&] { m_oIO->Initiate(false); });
+}
+
+void QZIviFgen::Abort() {
+    Frame("Abort", [&] { m_oIO->Abort(false); });
+}
+
+void QZIviFgen::SendSoftwareTrigger() {
+    Frame("SendSoftwareTrigger", [&] { m_oIO->SendSoftwareTrigger(); });
+}
+
 std::int32_t QZIviFgen::GetLastIviError() {
     return Frame("GetLastIviError", [&] { return m_oErr->GetLastIviError(); });
 }

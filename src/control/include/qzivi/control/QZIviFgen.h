@@ -36,6 +36,10 @@ public:
     void Init(bool DoIDQuery = false, bool DoReset = false, const std::string& OptionString = "",
               std::int32_t ReInitBehavior = qziviNoOp);
     void CloseSession();
+    void Configure();
+    void Initiate();
+    void Abort();
+    void SendSoftwareTrigger();
     std::int32_t GetLastIviError();
     void AboutBox();
 
@@ -75,6 +79,9 @@ public:
 
     // The host's name of this control; it prefixes every error source of the property tree.
     const std::string& DisplayName() const { return m_sDisplayName; }
+
+    // The engine, for the panels and pages that sit on this control.
+    CIviFgenIOImp& Engine() { return *m_oIO; }
 
 private:
     template <typename F>
