@@ -20,10 +20,14 @@ void Ignoring(F&& step) {
     }
 }
 
-bool Has(std::int32_t extensions, std::int32_t flag) { return (extensions & flag) != 0; }
+bool Has(std::int32_t extensions, std::int32_t flag) {
+    return (extensions & flag) != 0;
+}
 
 // What Configure stores as a boolean: -1 for true, as it is persisted.
-ViBoolean Stored(bool value) { return value ? static_cast<ViBoolean>(-1) : ViBoolean{0}; }
+ViBoolean Stored(bool value) {
+    return value ? static_cast<ViBoolean>(-1) : ViBoolean{0};
+}
 
 } // namespace
 
@@ -34,7 +38,8 @@ CIviFgenIOImp::~CIviFgenIOImp() {
     }
 }
 
-void CIviFgenIOImp::Construct(std::shared_ptr<CIviFgenPropImp> propSet, std::shared_ptr<CIviErrorReport> errorReport) {
+void CIviFgenIOImp::Construct(std::shared_ptr<CIviFgenPropImp> propSet,
+                              std::shared_ptr<CIviErrorReport> errorReport) {
     m_oProp = std::move(propSet);
     m_oErr = std::move(errorReport);
     auto forward = [this](std::int32_t code, const std::string& source, const std::string& text) {
@@ -48,19 +53,28 @@ void CIviFgenIOImp::Construct(std::shared_ptr<CIviFgenPropImp> propSet, std::sha
     });
 }
 
-void CIviFgenIOImp::SetNewPropSet(std::shared_ptr<CIviFgenPropImp> propSet) { m_oProp = std::move(propSet); }
+void CIviFgenIOImp::SetNewPropSet(std::shared_ptr<CIviFgenPropImp> propSet) {
+    m_oProp = std::move(propSet);
+}
 
-void CIviFgenIOImp::Init(bool doIDQuery, bool doReset, const std::string& optionString, std::int32_t reInitBehavior) {
+void CIviFgenIOImp::Init(bool doIDQuery, bool doReset, const std::string& optionString,
+                         std::int32_t reInitBehavior) {
     if (!m_oProp->Enabled()) return;
     std::string name = m_oProp->LogicalName();
     m_oErr->Init(name, doIDQuery, doReset, optionString, reInitBehavior);
 }
 
-void CIviFgenIOImp::CloseSession() { m_oErr->CloseSession(true); }
+void CIviFgenIOImp::CloseSession() {
+    m_oErr->CloseSession(true);
+}
 
-ViSession CIviFgenIOImp::Vi() const { return m_oErr->hSession(); }
+ViSession CIviFgenIOImp::Vi() const {
+    return m_oErr->hSession();
+}
 
-const std::string& CIviFgenIOImp::Path() const { return m_oProp->Path(); }
+const std::string& CIviFgenIOImp::Path() const {
+    return m_oProp->Path();
+}
 
 // ---- Configure ----------------------------------------------------------------------------------
 
@@ -88,8 +102,10 @@ void CIviFgenIOImp::Configure(bool internalCall) {
         }
         Init(false, false, "", qziviNoOp);
         std::int32_t saved = 0;
-        if (m_oErr->state() == IviStateBusy) runOwnsState = false; // refused below; the state is another's
-        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path() + "Configure", true, saved);
+        if (m_oErr->state() == IviStateBusy)
+            runOwnsState = false; // refused below; the state is another's
+        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path() + "Configure", true,
+                                   saved);
         Run(internalCall);
     } catch (...) {
         if (runOwnsState && m_oErr->state() > IviStateClosed) m_oErr->state(IviStateInitialized);
@@ -103,10 +119,12 @@ void CIviFgenIOImp::Run(bool internalCall) {
     const ViSession vi = Vi();
     const auto& channels = *prop.Channels();
 
-    CheckExtensions(ext, GetAttributeVi(AttrType::String, IVI_ATTR_GROUP_CAPABILITIES, "").AsText());
+    CheckExtensions(ext,
+                    GetAttributeVi(AttrType::String, IVI_ATTR_GROUP_CAPABILITIES, "").AsText());
     if (prop.AutoStopStart()) {
         Ignoring([&] { Abort(true); });
-        for (const auto& channel : channels) IviFgen_ConfigureOutputEnabled(vi, channel->Name().c_str(), VI_FALSE);
+        for (const auto& channel : channels)
+            IviFgen_ConfigureOutputEnabled(vi, channel->Name().c_str(), VI_FALSE);
     }
     for (const auto& channel : channels) {
         IviFgen_ConfigureAMEnabled(vi, channel->Name().c_str(), VI_FALSE);
@@ -122,42 +140,51 @@ void CIviFgenIOImp::Run(bool internalCall) {
     ClearDeletedHandles();
     CreateMissingHandles();
     Checked(IviFgen_ConfigureRefClockSource(vi, prop.RefClockSource()), "Base", "",
-            {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, AttrType::Int32, prop.RefClockSource(), Path(), "RefClockSource"}});
+            {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, AttrType::Int32, prop.RefClockSource(), Path(),
+              "RefClockSource"}});
     if (Has(ext, 2) && !Has(ext, 4) && mode != 0)
         Checked(IviFgen_ConfigureSampleRate(vi, prop.ArbSampleRate()), "Base", "",
-                {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, AttrType::Real64, prop.ArbSampleRate(), Path(), "ArbSampleRate"}});
+                {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, AttrType::Real64, prop.ArbSampleRate(), Path(),
+                  "ArbSampleRate"}});
 
     bool anyTrigger = false, anyAM = false, anyFM = false;
-    for (const auto& channel : channels) ConfigureChannel(*channel, anyTrigger, anyAM, anyFM);
+    for (const auto& channel : channels)
+        ConfigureChannel(*channel, anyTrigger, anyAM, anyFM);
 
     const auto& in = *prop.Internal();
     if (Has(ext, 256) && anyAM)
-        Checked(IviFgen_ConfigureAMInternal(vi, in.AMInternalDepth(), in.AMInternalWaveform(), in.AMInternalFrequency()),
+        Checked(IviFgen_ConfigureAMInternal(vi, in.AMInternalDepth(), in.AMInternalWaveform(),
+                                            in.AMInternalFrequency()),
                 "ModulateAM", "",
-                {{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, AttrType::Real64, in.AMInternalDepth(), in.Path(), "AMInternalDepth"},
-                 {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, AttrType::Int32, in.AMInternalWaveform(), in.Path(),
-                  "AMInternalWaveform"},
-                 {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, AttrType::Real64, in.AMInternalFrequency(), in.Path(),
-                  "AMInternalFrequency"}});
+                {{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, AttrType::Real64, in.AMInternalDepth(), in.Path(),
+                  "AMInternalDepth"},
+                 {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, AttrType::Int32, in.AMInternalWaveform(),
+                  in.Path(), "AMInternalWaveform"},
+                 {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, AttrType::Real64, in.AMInternalFrequency(),
+                  in.Path(), "AMInternalFrequency"}});
     if (Has(ext, 512) && anyFM)
-        Checked(IviFgen_ConfigureFMInternal(vi, in.FMInternalDeviation(), in.FMInternalWaveform(), in.FMInternalFrequency()),
+        Checked(IviFgen_ConfigureFMInternal(vi, in.FMInternalDeviation(), in.FMInternalWaveform(),
+                                            in.FMInternalFrequency()),
                 "ModulateFM", "",
-                {{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, AttrType::Real64, in.FMInternalDeviation(), in.Path(),
-                  "FMInternalDeviation"},
-                 {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, AttrType::Int32, in.FMInternalWaveform(), in.Path(),
-                  "FMInternalWaveform"},
-                 {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, AttrType::Real64, in.FMInternalFrequency(), in.Path(),
-                  "FMInternalFrequency"}});
+                {{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, AttrType::Real64, in.FMInternalDeviation(),
+                  in.Path(), "FMInternalDeviation"},
+                 {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, AttrType::Int32, in.FMInternalWaveform(),
+                  in.Path(), "FMInternalWaveform"},
+                 {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, AttrType::Real64, in.FMInternalFrequency(),
+                  in.Path(), "FMInternalFrequency"}});
     if (Has(ext, 32) && anyTrigger)
-        Checked(IviFgen_ConfigureInternalTriggerRate(vi, in.InternalTriggerRate()), "InternalTrigger", "",
-                {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, AttrType::Real64, in.InternalTriggerRate(), in.Path(),
-                  "InternalTriggerRate"}});
+        Checked(IviFgen_ConfigureInternalTriggerRate(vi, in.InternalTriggerRate()),
+                "InternalTrigger", "",
+                {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, AttrType::Real64, in.InternalTriggerRate(),
+                  in.Path(), "InternalTriggerRate"}});
 
     for (const auto& channel : channels) {
         const ViBoolean enabled = Stored(channel->OutputEnabled());
-        Checked(IviFgen_ConfigureOutputEnabled(vi, channel->Name().c_str(), enabled), "Base", channel->Name(),
-                {{IVIFGEN_ATTR_OUTPUT_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(static_cast<std::int16_t>(enabled)),
-                  channel->Path(), "OutputEnabled"}});
+        Checked(IviFgen_ConfigureOutputEnabled(vi, channel->Name().c_str(), enabled), "Base",
+                channel->Name(),
+                {{IVIFGEN_ATTR_OUTPUT_ENABLED, AttrType::Boolean,
+                  static_cast<std::int32_t>(static_cast<std::int16_t>(enabled)), channel->Path(),
+                  "OutputEnabled"}});
     }
     if (prop.AutoStopStart()) Initiate(true);
     ClearDeletedHandles();
@@ -165,76 +192,98 @@ void CIviFgenIOImp::Run(bool internalCall) {
     if (!internalCall) Configured();
 }
 
-void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, bool& anyAM, bool& anyFM) {
+void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, bool& anyAM,
+                                     bool& anyFM) {
     auto& prop = *m_oProp;
     const std::int32_t ext = prop.Extensions();
     const ViSession vi = Vi();
     const std::string& name = ch.Name();
     const std::string& path = ch.Path();
 
-    const ViStatus impedance = IviFgen_ConfigureOutputImpedance(vi, name.c_str(), ch.OutputImpedance());
+    const ViStatus impedance =
+        IviFgen_ConfigureOutputImpedance(vi, name.c_str(), ch.OutputImpedance());
     if (impedance == IVI_ERROR_UNKNOWN_CHANNEL_NAME) m_oErr->DoStdError(-31617, name, 0, "");
     Checked(impedance, "Base", name,
-            {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, AttrType::Real64, ch.OutputImpedance(), path, "OutputImpedance"}});
+            {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, AttrType::Real64, ch.OutputImpedance(), path,
+              "OutputImpedance"}});
     Checked(IviFgen_ConfigureOperationMode(vi, name.c_str(), ch.OperationMode()), "Base", name,
-            {{IVIFGEN_ATTR_OPERATION_MODE, AttrType::Int32, ch.OperationMode(), path, "OperationMode"}});
+            {{IVIFGEN_ATTR_OPERATION_MODE, AttrType::Int32, ch.OperationMode(), path,
+              "OperationMode"}});
     if (Has(ext, 128) && ch.OperationMode() == 1)
         Checked(IviFgen_ConfigureBurstCount(vi, name.c_str(), ch.BurstCount()), "Burst", name,
                 {{IVIFGEN_ATTR_BURST_COUNT, AttrType::Int32, ch.BurstCount(), path, "BurstCount"}});
     if (Has(ext, 16)) {
-        Checked(IviFgen_ConfigureTriggerSource(vi, name.c_str(), ch.TriggerSource()), "Trigger", name,
-                {{IVIFGEN_ATTR_TRIGGER_SOURCE, AttrType::Int32, ch.TriggerSource(), path, "TriggerSource"}});
+        Checked(IviFgen_ConfigureTriggerSource(vi, name.c_str(), ch.TriggerSource()), "Trigger",
+                name,
+                {{IVIFGEN_ATTR_TRIGGER_SOURCE, AttrType::Int32, ch.TriggerSource(), path,
+                  "TriggerSource"}});
         if (ch.TriggerSource() == 3) anyTrigger = true;
     }
 
     switch (prop.OutputMode()) {
     case 0:
         if (!Has(ext, 1)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
-        Checked(IviFgen_ConfigureStandardWaveform(vi, name.c_str(), ch.FuncWaveform(), ch.FuncAmplitude(),
-                                                  ch.FuncDCOffset(), ch.FuncFrequency(), ch.FuncStartPhase()),
-                "StdFunc", name,
-                {{IVIFGEN_ATTR_FUNC_WAVEFORM, AttrType::Int32, ch.FuncWaveform(), path, "FuncWaveform"},
-                 {IVIFGEN_ATTR_FUNC_AMPLITUDE, AttrType::Real64, ch.FuncAmplitude(), path, "FuncAmplitude"},
-                 {IVIFGEN_ATTR_FUNC_DC_OFFSET, AttrType::Real64, ch.FuncDCOffset(), path, "FuncDCOffset"},
-                 {IVIFGEN_ATTR_FUNC_FREQUENCY, AttrType::Real64, ch.FuncFrequency(), path, "FuncFrequency"},
-                 {IVIFGEN_ATTR_FUNC_START_PHASE, AttrType::Real64, ch.FuncStartPhase(), path, "FuncStartPhase"}});
+        Checked(
+            IviFgen_ConfigureStandardWaveform(vi, name.c_str(), ch.FuncWaveform(),
+                                              ch.FuncAmplitude(), ch.FuncDCOffset(),
+                                              ch.FuncFrequency(), ch.FuncStartPhase()),
+            "StdFunc", name,
+            {{IVIFGEN_ATTR_FUNC_WAVEFORM, AttrType::Int32, ch.FuncWaveform(), path, "FuncWaveform"},
+             {IVIFGEN_ATTR_FUNC_AMPLITUDE, AttrType::Real64, ch.FuncAmplitude(), path,
+              "FuncAmplitude"},
+             {IVIFGEN_ATTR_FUNC_DC_OFFSET, AttrType::Real64, ch.FuncDCOffset(), path,
+              "FuncDCOffset"},
+             {IVIFGEN_ATTR_FUNC_FREQUENCY, AttrType::Real64, ch.FuncFrequency(), path,
+              "FuncFrequency"},
+             {IVIFGEN_ATTR_FUNC_START_PHASE, AttrType::Real64, ch.FuncStartPhase(), path,
+              "FuncStartPhase"}});
         break;
     case 1: {
         if (!Has(ext, 2)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
         if (!ch.ArbWaveform()) {
-            if (prop.Waveforms()->Count() == 0) m_oErr->DoStdError(-31622, Path() + "Configure", 0, "");
+            if (prop.Waveforms()->Count() == 0)
+                m_oErr->DoStdError(-31622, Path() + "Configure", 0, "");
             ch.ArbWaveform(prop.Waveforms()->At(1));
         }
         const std::int32_t handle = ch.ArbWaveform() ? ch.ArbWaveform()->WaveformHandle() : 0;
-        Checked(IviFgen_ConfigureArbWaveform(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()), "ArbWfm", name,
-                {{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, AttrType::Int32, handle, path, "ArbWaveform"},
-                 {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
-                 {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
+        Checked(
+            IviFgen_ConfigureArbWaveform(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()),
+            "ArbWfm", name,
+            {{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, AttrType::Int32, handle, path, "ArbWaveform"},
+             {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
+             {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
         if (Has(ext, 4))
-            Checked(IviFgen_ConfigureArbFrequency(vi, name.c_str(), ch.ArbFrequency()), "ArbFrequency", name,
-                    {{IVIFGEN_ATTR_ARB_FREQUENCY, AttrType::Real64, ch.ArbFrequency(), path, "ArbFrequency"}});
+            Checked(IviFgen_ConfigureArbFrequency(vi, name.c_str(), ch.ArbFrequency()),
+                    "ArbFrequency", name,
+                    {{IVIFGEN_ATTR_ARB_FREQUENCY, AttrType::Real64, ch.ArbFrequency(), path,
+                      "ArbFrequency"}});
         break;
     }
     case 2: {
         if (!Has(ext, 8)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
         if (!ch.Sequence()) {
-            if (prop.Sequences()->Count() == 0) m_oErr->DoStdError(-31616, Path() + "Configure", 0, "");
+            if (prop.Sequences()->Count() == 0)
+                m_oErr->DoStdError(-31616, Path() + "Configure", 0, "");
             ch.Sequence(prop.Sequences()->At(1));
         }
         const std::int32_t handle = ch.Sequence() ? ch.Sequence()->SequenceHandle() : 0;
-        Checked(IviFgen_ConfigureArbSequence(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()), "ArbSeq", name,
-                {{IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, AttrType::Int32, handle, path, "Sequence"},
-                 {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
-                 {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
+        Checked(
+            IviFgen_ConfigureArbSequence(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()),
+            "ArbSeq", name,
+            {{IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, AttrType::Int32, handle, path, "Sequence"},
+             {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
+             {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
         break;
     }
-    default: break;
+    default:
+        break;
     }
 
     if (Has(ext, 256)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.AMEnabled());
         Checked(IviFgen_ConfigureAMEnabled(vi, name.c_str(), on), "ModulateAM", name,
-                {{IVIFGEN_ATTR_AM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path, "AMEnabled"}});
+                {{IVIFGEN_ATTR_AM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
+                  "AMEnabled"}});
         if (ch.AMEnabled()) {
             Checked(IviFgen_ConfigureAMSource(vi, name.c_str(), ch.AMSource()), "ModulateAM", name,
                     {{IVIFGEN_ATTR_AM_SOURCE, AttrType::Int32, ch.AMSource(), path, "AMSource"}});
@@ -244,7 +293,8 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
     if (Has(ext, 512)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.FMEnabled());
         Checked(IviFgen_ConfigureFMEnabled(vi, name.c_str(), on), "ModulateFM", name,
-                {{IVIFGEN_ATTR_FM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path, "FMEnabled"}});
+                {{IVIFGEN_ATTR_FM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
+                  "FMEnabled"}});
         if (ch.FMEnabled()) {
             Checked(IviFgen_ConfigureFMSource(vi, name.c_str(), ch.FMSource()), "ModulateFM", name,
                     {{IVIFGEN_ATTR_FM_SOURCE, AttrType::Int32, ch.FMSource(), path, "FMSource"}});
@@ -272,21 +322,25 @@ void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, const std::string& 
         std::int32_t flag;
         const char* word;
     };
-    static constexpr Word kWords[] = {{4, "ArbFrequency"},   {8, "ArbSeq"},     {2, "ArbWfm"},
-                                      {128, "Burst"},        {32, "InternalTrigger"}, {256, "ModulateAM"},
-                                      {512, "ModulateFM"},   {64, "SoftwareTrigger"}, {1, "StdFunc"},
-                                      {16, "Trigger"}};
+    static constexpr Word kWords[] = {
+        {4, "ArbFrequency"},     {8, "ArbSeq"},       {2, "ArbWfm"},       {128, "Burst"},
+        {32, "InternalTrigger"}, {256, "ModulateAM"}, {512, "ModulateFM"}, {64, "SoftwareTrigger"},
+        {1, "StdFunc"},          {16, "Trigger"}};
     std::string missing;
     for (const auto& [flag, word] : kWords)
-        if (Has(extensions, flag) && capabilities.find(std::string("IviFgen") + word) == std::string::npos)
+        if (Has(extensions, flag) &&
+            capabilities.find(std::string("IviFgen") + word) == std::string::npos)
             missing += (missing.empty() ? "" : ", ") + std::string(word);
     if (!missing.empty())
-        throw Failure(30717, missing, "Extension capability not supported by instrument driver.  (" + missing + ")");
+        throw Failure(30717, missing,
+                      "Extension capability not supported by instrument driver.  (" + missing +
+                          ")");
 }
 
 void CIviFgenIOImp::ClearDeletedHandles() {
     const ViSession vi = Vi();
-    auto clear = [](DeletedHandleQueue& queue, ViStatus (*call)(ViSession, ViInt32), ViSession session) {
+    auto clear = [](DeletedHandleQueue& queue, ViStatus (*call)(ViSession, ViInt32),
+                    ViSession session) {
         const std::int32_t n = queue.DeletedHandleCount();
         std::int32_t removed = 0;
         for (std::int32_t i = 1; i <= n; ++i)
@@ -309,8 +363,8 @@ void CIviFgenIOImp::CreateMissingHandles() {
             const Points data = waveform->Data();
             if (!data) m_oErr->DoStdError(-31613, waveform->Name(), 0, "");
             ViInt32 handle = 0;
-            const ViStatus status =
-                IviFgen_CreateArbWaveform(vi, static_cast<ViInt32>(data->size()), data->data(), &handle);
+            const ViStatus status = IviFgen_CreateArbWaveform(
+                vi, static_cast<ViInt32>(data->size()), data->data(), &handle);
             m_oErr->IviCheckError(status, waveform->Name(), 0, waveform->Name());
             waveform->SetWaveformHandle(handle);
         }
@@ -323,7 +377,8 @@ void CIviFgenIOImp::CreateMissingHandles() {
             const auto handles = sequence->WaveformHandles();
             const auto counts = sequence->IterationCounts();
             ViInt32 handle = 0;
-            const ViStatus status = IviFgen_CreateArbSequence(vi, sequence->Count(), handles.data(), counts.data(), &handle);
+            const ViStatus status = IviFgen_CreateArbSequence(vi, sequence->Count(), handles.data(),
+                                                              counts.data(), &handle);
             m_oErr->IviCheckError(status, sequence->Name(), 0, sequence->Name());
             sequence->SetSequenceHandle(handle);
         }
@@ -331,13 +386,16 @@ void CIviFgenIOImp::CreateMissingHandles() {
 
 void CIviFgenIOImp::ResetHandles() {
     if (!m_oProp) return;
-    for (const auto& waveform : *m_oProp->Waveforms()) waveform->SetWaveformHandle(0);
-    for (const auto& sequence : *m_oProp->Sequences()) sequence->SetSequenceHandle(0);
+    for (const auto& waveform : *m_oProp->Waveforms())
+        waveform->SetWaveformHandle(0);
+    for (const auto& sequence : *m_oProp->Sequences())
+        sequence->SetSequenceHandle(0);
 }
 
 // ---- Generation ---------------------------------------------------------------------------------
 
-void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char* word, ViStatus (*call)(ViSession)) {
+void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char* word,
+                               ViStatus (*call)(ViSession)) {
     if (!m_oProp->Enabled()) return;
     const std::int32_t saved = m_oErr->state();
     try {
@@ -351,30 +409,43 @@ void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char*
     }
 }
 
-void CIviFgenIOImp::Initiate(bool internalCall) { Generation(internalCall, -5, "Initiate", &IviFgen_InitiateGeneration); }
+void CIviFgenIOImp::Initiate(bool internalCall) {
+    Generation(internalCall, -5, "Initiate", &IviFgen_InitiateGeneration);
+}
 
 void CIviFgenIOImp::Abort(bool internalCall) {
     Generation(internalCall, IviStateClosed | IviStateBusy, "Abort", &IviFgen_AbortGeneration);
 }
 
-void CIviFgenIOImp::SendSoftwareTrigger() { Generation(false, -5, "SendSoftwareTrigger", &IviFgen_SendSoftwareTrigger); }
+void CIviFgenIOImp::SendSoftwareTrigger() {
+    Generation(false, -5, "SendSoftwareTrigger", &IviFgen_SendSoftwareTrigger);
+}
 
 // ---- Capability queries -------------------------------------------------------------------------
 
-bool CIviFgenIOImp::CheckAttributeVi(AttrType type, ViAttr id, const Variant& value, const std::string& channel) {
+bool CIviFgenIOImp::CheckAttributeVi(AttrType type, ViAttr id, const Variant& value,
+                                     const std::string& channel) {
     const ViSession vi = Vi();
     const char* ch = channel.c_str();
     ViStatus status = 0;
     switch (type) {
     case AttrType::Boolean:
-        status = IviFgen_CheckAttributeViBoolean(vi, ch, id, static_cast<ViBoolean>(value.AsInt16()));
+        status =
+            IviFgen_CheckAttributeViBoolean(vi, ch, id, static_cast<ViBoolean>(value.AsInt16()));
         break;
-    case AttrType::Int32: status = IviFgen_CheckAttributeViInt32(vi, ch, id, value.AsInt32()); break;
-    case AttrType::Real64: status = IviFgen_CheckAttributeViReal64(vi, ch, id, value.AsDouble()); break;
+    case AttrType::Int32:
+        status = IviFgen_CheckAttributeViInt32(vi, ch, id, value.AsInt32());
+        break;
+    case AttrType::Real64:
+        status = IviFgen_CheckAttributeViReal64(vi, ch, id, value.AsDouble());
+        break;
     case AttrType::Session:
-        status = IviFgen_CheckAttributeViSession(vi, ch, id, static_cast<ViSession>(value.AsInt32()));
+        status =
+            IviFgen_CheckAttributeViSession(vi, ch, id, static_cast<ViSession>(value.AsInt32()));
         break;
-    case AttrType::String: status = IviFgen_CheckAttributeViString(vi, ch, id, value.AsText().c_str()); break;
+    case AttrType::String:
+        status = IviFgen_CheckAttributeViString(vi, ch, id, value.AsText().c_str());
+        break;
     }
     if (status == IVI_ERROR_FUNCTION_NOT_SUPPORTED) status = 0;
     return status == 0;
@@ -427,7 +498,8 @@ std::vector<double> CIviFgenIOImp::IviFgenGetRanges(ViAttr id, const std::string
     ViStatus status = IviFgen_GetSpecificDriverCHandle(Vi(), &specific);
     if (status == 0) {
         ViBoolean hasMinimum = 0, hasMaximum = 0;
-        status = Ivi_GetAttrMinMaxViReal64(specific, channel.c_str(), id, &minimum, &maximum, &hasMinimum, &hasMaximum);
+        status = Ivi_GetAttrMinMaxViReal64(specific, channel.c_str(), id, &minimum, &maximum,
+                                           &hasMinimum, &hasMaximum);
     }
     m_oErr->IviCheckError(status, "", 8, "");
     if (status != 0) {
@@ -436,9 +508,12 @@ std::vector<double> CIviFgenIOImp::IviFgenGetRanges(ViAttr id, const std::string
             double minimum, maximum;
         };
         static constexpr Fallback kFallbacks[] = {
-            {IVIFGEN_ATTR_FUNC_AMPLITUDE, -10, 10},      {IVIFGEN_ATTR_FUNC_DC_OFFSET, -10, 10},
-            {IVIFGEN_ATTR_FUNC_FREQUENCY, 1e-10, 1e12},  {IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH, 0, 100},
-            {IVIFGEN_ATTR_ARB_GAIN, 0.1, 5},             {IVIFGEN_ATTR_ARB_OFFSET, -5, 5},
+            {IVIFGEN_ATTR_FUNC_AMPLITUDE, -10, 10},
+            {IVIFGEN_ATTR_FUNC_DC_OFFSET, -10, 10},
+            {IVIFGEN_ATTR_FUNC_FREQUENCY, 1e-10, 1e12},
+            {IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH, 0, 100},
+            {IVIFGEN_ATTR_ARB_GAIN, 0.1, 5},
+            {IVIFGEN_ATTR_ARB_OFFSET, -5, 5},
             {IVIFGEN_ATTR_ARB_FREQUENCY, 1e-11, 1e12},
         };
         minimum = maximum = 0;
@@ -455,16 +530,20 @@ std::vector<Variant> CIviFgenIOImp::IVIFgenGetValidFunctions(bool keepStandard) 
     const std::int32_t ext = m_oProp->Extensions();
     if (!keepStandard)
         for (std::int32_t v = 1; v <= 6; ++v) {
-            const bool available = Has(ext, 1) && (CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "") ||
-                                                   CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "1"));
+            const bool available =
+                Has(ext, 1) &&
+                (CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "") ||
+                 CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "1"));
             m_aValidFunctions[static_cast<std::size_t>(v - 1)] = available ? 1 : 0;
         }
     ViInt32 a = 0, b = 0, c = 0, d = 0;
-    m_aValidFunctions[6] = Has(ext, 2) && IviFgen_QueryArbWfmCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
+    m_aValidFunctions[6] = Has(ext, 2) &&
+                                   IviFgen_QueryArbWfmCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
                                    m_oProp->Waveforms()->Count() > 0
                                ? 1
                                : 0;
-    m_aValidFunctions[7] = Has(ext, 8) && IviFgen_QueryArbSeqCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
+    m_aValidFunctions[7] = Has(ext, 8) &&
+                                   IviFgen_QueryArbSeqCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
                                    m_oProp->Sequences()->Count() > 0
                                ? 1
                                : 0;

@@ -31,12 +31,14 @@ public:
     CIviFgenIOImp(const CIviFgenIOImp&) = delete;
     CIviFgenIOImp& operator=(const CIviFgenIOImp&) = delete;
 
-    void Construct(std::shared_ptr<CIviFgenPropImp> propSet, std::shared_ptr<CIviErrorReport> errorReport);
+    void Construct(std::shared_ptr<CIviFgenPropImp> propSet,
+                   std::shared_ptr<CIviErrorReport> errorReport);
     void SetNewPropSet(std::shared_ptr<CIviFgenPropImp> propSet);
     const std::shared_ptr<CIviFgenPropImp>& PropSet() const { return m_oProp; }
 
     // Opens the session of the set's LogicalName, unless the set is not Enabled.
-    void Init(bool doIDQuery, bool doReset, const std::string& optionString, std::int32_t reInitBehavior);
+    void Init(bool doIDQuery, bool doReset, const std::string& optionString,
+              std::int32_t reInitBehavior);
     void CloseSession();
 
     // Sends the whole tree. The control passes false; the sequence pre-pass passes true.
@@ -52,7 +54,8 @@ public:
     // With keepStandard the first six stay as the last call left them (empty before any).
     std::vector<Variant> IVIFgenGetValidFunctions(bool keepStandard);
     // Whether the driver would take the value; nothing is reported.
-    bool CheckAttributeVi(AttrType type, ViAttr id, const Variant& value, const std::string& channel);
+    bool CheckAttributeVi(AttrType type, ViAttr id, const Variant& value,
+                          const std::string& channel);
     // The value; a negative status raises with Path + "GetAttribute".
     Variant GetAttributeVi(AttrType type, ViAttr id, const std::string& channel);
 
@@ -70,12 +73,14 @@ private:
     };
 
     void Run(bool internalCall);
-    void Checked(ViStatus status, const char* word, const std::string& channel, std::initializer_list<Param> params);
+    void Checked(ViStatus status, const char* word, const std::string& channel,
+                 std::initializer_list<Param> params);
     void CheckExtensions(std::int32_t extensions, const std::string& capabilities);
     void ClearDeletedHandles();
     void CreateMissingHandles();
     void ConfigureChannel(QZIviFgenChannel& channel, bool& anyTrigger, bool& anyAM, bool& anyFM);
-    void Generation(bool internalCall, std::int32_t mask, const char* word, ViStatus (*call)(ViSession));
+    void Generation(bool internalCall, std::int32_t mask, const char* word,
+                    ViStatus (*call)(ViSession));
     void ResetHandles();
     ViSession Vi() const;
     const std::string& Path() const;

@@ -145,7 +145,9 @@ public:
     }
     std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
     std::string DefaultName() const { return items_.DefaultName("Waveform"); }
-    const std::shared_ptr<QZIviFgenArbWaveform>& At(std::int32_t position) const { return items_.At(position); }
+    const std::shared_ptr<QZIviFgenArbWaveform>& At(std::int32_t position) const {
+        return items_.At(position);
+    }
 
 private:
     std::int32_t Limit(const char* operation, ViAttr attribute);
