@@ -73,6 +73,15 @@ void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::stri
     if (setBusy) state(IviStateBusy);
 }
 
+void CIviErrorReport::CheckForValidState(std::int32_t forbidden, std::string_view path,
+                                         std::string_view word, bool setBusy,
+                                         std::int32_t& result) {
+    if ((forbidden & state_) != 0)
+        CheckForValidState(forbidden, std::string(path).append(word), setBusy, result);
+    result = state_;
+    if (setBusy) state(IviStateBusy);
+}
+
 ViSession CIviErrorReport::hSession() const {
     if (IviSession_)
         return static_cast<ViSession>(SessionMgrCall([&] { return IviSession_->Handle(1); }));
@@ -247,7 +256,7 @@ std::int32_t CIviErrorReport::MapIviError(ViStatus status) {
     return status;
 }
 
-std::string CIviErrorReport::BuildIviDescription(ViStatus status, const std::string& extra) const {
+std::string CIviErrorReport::BuildIviDescription(ViStatus status, std::string_view extra) const {
     ViChar message[256] = {};
     ViChar elaboration[256] = {};
     ViSession session = 0;
@@ -260,7 +269,7 @@ std::string CIviErrorReport::BuildIviDescription(ViStatus status, const std::str
     IviFgen_GetAttributeViString(session, "", IVI_ATTR_ERROR_ELABORATION, sizeof elaboration,
                                  elaboration);
     std::string text;
-    if (!extra.empty()) text += "(" + extra + ") ";
+    if (!extra.empty()) text.append("(").append(extra).append(") ");
     text += TrimAtNull(message, sizeof message);
     const std::string more = TrimAtNull(elaboration, sizeof elaboration);
     if (!more.empty()) text += " " + more;
@@ -272,19 +281,13 @@ std::string CIviErrorReport::BuildIviDescription(ViStatus status, const std::str
     return text;
 }
 
-ViStatus CIviErrorReport::IviCheckError(ViStatus status, std::string source, std::int32_t flags,
-                                        const std::string& extra) {
-    if (status == 0) {
-        lastIviError_ = 0;
-        return status;
-    }
+ViStatus CIviErrorReport::ReportStatus(ViStatus status, std::string_view sourceGiven,
+                                       std::int32_t flags, std::string_view extra) {
     const std::int32_t code = MapIviError(status);
     lastIviError_ = code;
     if (code == status) return status;
-    if (!source.empty())
-        lastSource_ = source;
-    else
-        source = lastSource_;
+    if (!sourceGiven.empty()) lastSource_ = sourceGiven;
+    const std::string source = lastSource_;
     const std::string description = BuildIviDescription(status, extra);
     if (flags & 8) return status;
     if (status > 0) {

@@ -104,8 +104,7 @@ void CIviFgenIOImp::Configure(bool internalCall) {
         std::int32_t saved = 0;
         if (m_oErr->state() == IviStateBusy)
             runOwnsState = false; // refused below; the state is another's
-        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path() + "Configure", true,
-                                   saved);
+        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path(), "Configure", true, saved);
         Run(internalCall);
     } catch (...) {
         if (runOwnsState && m_oErr->state() > IviStateClosed) m_oErr->state(IviStateInitialized);
@@ -119,8 +118,13 @@ void CIviFgenIOImp::Run(bool internalCall) {
     const ViSession vi = Vi();
     const auto& channels = *prop.Channels();
 
+    ViChar capabilities[1000];
+    capabilities[0] = '\0';
+    const ViStatus read = IviFgen_GetAttributeViString(vi, "", IVI_ATTR_GROUP_CAPABILITIES,
+                                                       sizeof capabilities, capabilities);
+    m_oErr->IviCheckError(read, read == 0 ? std::string() : Path() + "GetAttribute", 0, "");
     CheckExtensions(ext,
-                    GetAttributeVi(AttrType::String, IVI_ATTR_GROUP_CAPABILITIES, "").AsText());
+                    std::string_view(capabilities, ::strnlen(capabilities, sizeof capabilities)));
     if (prop.AutoStopStart()) {
         Ignoring([&] { Abort(true); });
         for (const auto& channel : channels)
@@ -310,31 +314,36 @@ void CIviFgenIOImp::Checked(ViStatus status, const char* word, const std::string
     m_oErr->IviCheckError(status, word, 8, "");
     if (status == 0) return;
     for (const auto& p : params)
-        if (!CheckAttributeVi(p.type, p.id, p.value, channel))
+        if (!CheckNumber(p.type, p.id, p.value, channel.c_str()))
             m_oErr->DoStdError(-30002, p.owner + p.name, status, channel);
     // Every value would be taken: the driver's own status stands. An error raises; a warning
     // fires and the run goes on.
     m_oErr->IviCheckError(status, "", 0, "");
 }
 
-void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, const std::string& capabilities) {
+void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, std::string_view capabilities) {
+    // The same question as last time has the same answer.
+    if (extensions == m_lCheckedExtensions && capabilities == m_sCheckedCapabilities) return;
     struct Word {
         std::int32_t flag;
-        const char* word;
+        std::string_view group; // "IviFgen" and the word
     };
     static constexpr Word kWords[] = {
-        {4, "ArbFrequency"},     {8, "ArbSeq"},       {2, "ArbWfm"},       {128, "Burst"},
-        {32, "InternalTrigger"}, {256, "ModulateAM"}, {512, "ModulateFM"}, {64, "SoftwareTrigger"},
-        {1, "StdFunc"},          {16, "Trigger"}};
+        {4, "IviFgenArbFrequency"}, {8, "IviFgenArbSeq"},           {2, "IviFgenArbWfm"},
+        {128, "IviFgenBurst"},      {32, "IviFgenInternalTrigger"}, {256, "IviFgenModulateAM"},
+        {512, "IviFgenModulateFM"}, {64, "IviFgenSoftwareTrigger"}, {1, "IviFgenStdFunc"},
+        {16, "IviFgenTrigger"}};
     std::string missing;
-    for (const auto& [flag, word] : kWords)
-        if (Has(extensions, flag) &&
-            capabilities.find(std::string("IviFgen") + word) == std::string::npos)
-            missing += (missing.empty() ? "" : ", ") + std::string(word);
-    if (!missing.empty())
-        throw Failure(30717, missing,
-                      "Extension capability not supported by instrument driver.  (" + missing +
-                          ")");
+    for (const auto& [flag, group] : kWords)
+        if (Has(extensions, flag) && capabilities.find(group) == std::string_view::npos)
+            missing.append(missing.empty() ? "" : ", ").append(group.substr(7));
+    if (missing.empty()) {
+        m_lCheckedExtensions = extensions;
+        m_sCheckedCapabilities = capabilities;
+        return;
+    }
+    throw Failure(30717, missing,
+                  "Extension capability not supported by instrument driver.  (" + missing + ")");
 }
 
 void CIviFgenIOImp::ClearDeletedHandles() {
@@ -400,8 +409,9 @@ void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char*
     const std::int32_t saved = m_oErr->state();
     try {
         std::int32_t present = 0;
-        if (!internalCall) m_oErr->CheckForValidState(mask, Path() + word, true, present);
-        m_oErr->IviCheckError(call(Vi()), Path() + word, 0, "");
+        if (!internalCall) m_oErr->CheckForValidState(mask, Path(), word, true, present);
+        const ViStatus status = call(Vi());
+        m_oErr->IviCheckError(status, status == 0 ? std::string() : Path() + word, 0, "");
         m_oErr->state(saved);
     } catch (...) {
         m_oErr->state(saved);
@@ -422,6 +432,11 @@ void CIviFgenIOImp::SendSoftwareTrigger() {
 }
 
 // ---- Capability queries -------------------------------------------------------------------------
+
+bool CIviFgenIOImp::CheckNumber(AttrType type, ViAttr id, double value, const char* channel) {
+    return type == AttrType::Real64 ? CheckAttributeVi(type, id, value, channel)
+                                    : CheckAttributeVi(type, id, static_cast<int>(value), channel);
+}
 
 bool CIviFgenIOImp::CheckAttributeVi(AttrType type, ViAttr id, const Variant& value,
                                      const std::string& channel) {

@@ -181,6 +181,21 @@ TEST_F(SimulatorTest, AmplitudeAndOffsetShareTheVoltageWindow) {
     EXPECT_DOUBLE_EQ(hi, 4.0);
 }
 
+TEST_F(SimulatorTest, ArbitraryFrequencyLimitFollowsTheWaveformOnlyWhileInUse) {
+    Session s;
+    const ViSession vi = s.vi();
+    const ViInt32 big = CreateWaveform(s, 1000000); // 250 MSa/s allow 250 Hz for it
+    EXPECT_EQ(IviFgen_ConfigureArbWaveform(vi, "Channel1", big, 1, 0), VI_SUCCESS)
+        << "the channel plays at the sample rate; its arbitrary frequency of 1 kHz is not in use";
+    EXPECT_EQ(IviFgen_ConfigureArbFrequency(vi, "Channel1", 1000), IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(IviFgen_ConfigureArbFrequency(vi, "Channel1", 200), VI_SUCCESS);
+    const ViInt32 small = CreateWaveform(s, 100);
+    EXPECT_EQ(IviFgen_ConfigureArbWaveform(vi, "Channel1", small, 1, 0), VI_SUCCESS);
+    EXPECT_EQ(IviFgen_ConfigureArbFrequency(vi, "Channel1", 1e6), VI_SUCCESS);
+    EXPECT_EQ(IviFgen_ConfigureArbWaveform(vi, "Channel1", big, 1, 0), IVI_ERROR_INVALID_VALUE)
+        << "now it plays at 1 MHz, which the big waveform cannot";
+}
+
 TEST_F(SimulatorTest, RefusesWhatNoInstrumentTakes) {
     Session s;
     const ViSession vi = s.vi();

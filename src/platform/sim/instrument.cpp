@@ -414,7 +414,8 @@ void Instrument::Validate(const GlobalState& g, const ChannelState& s) const {
                 std::to_string(s.sequenceHandle));
     range(IVIFGEN_ATTR_ARB_GAIN, s.arbGain, "");
     range(IVIFGEN_ATTR_ARB_OFFSET, s.arbOffset, "V");
-    range(IVIFGEN_ATTR_ARB_FREQUENCY, s.arbFrequency, "Hz");
+    // The arbitrary frequency is held to the waveform only while the channel plays at it.
+    if (s.playsAtArbFrequency) range(IVIFGEN_ATTR_ARB_FREQUENCY, s.arbFrequency, "Hz");
     if (s.triggerSource == IVIFGEN_VAL_SOFTWARE_TRIG && !Offers(Group::SoftwareTrigger))
         NotSupported(IVIFGEN_ATTR_TRIGGER_SOURCE, s.triggerSource);
     if (s.triggerSource == IVIFGEN_VAL_INTERNAL_TRIGGER && !Offers(Group::InternalTrigger))

@@ -10,6 +10,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <string_view>
 
 namespace qzivi {
 
@@ -61,6 +62,9 @@ public:
     // otherwise gives the present state in `result` and, if asked, turns busy.
     void CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy,
                             std::int32_t& result);
+    // The same, with the source made of a path and a word only when the call is refused.
+    void CheckForValidState(std::int32_t forbidden, std::string_view path, std::string_view word,
+                            bool setBusy, std::int32_t& result);
 
     ViSession hSession() const;
     void hSession(ViSession session);
@@ -82,14 +86,20 @@ public:
     // ---- Errors ----
     static std::int32_t MapIviError(ViStatus status);
     // Reports a driver status: warnings fire, errors raise; flags 8 only looks. Returns `status`.
-    ViStatus IviCheckError(ViStatus status, std::string source, std::int32_t flags,
-                           const std::string& extra);
+    ViStatus IviCheckError(ViStatus status, std::string_view source, std::int32_t flags,
+                           std::string_view extra) {
+        if (status == 0) { // the common case, kept inline: it runs after every driver call
+            lastIviError_ = 0;
+            return status;
+        }
+        return ReportStatus(status, source, flags, extra);
+    }
     std::int32_t GetLastIviError() const { return lastIviError_; }
     void RaiseErrorEvents(std::int32_t code, const std::string& source,
                           const std::string& description);
     [[noreturn]] void DoStdError(std::int32_t code, const std::string& source,
                                  ViStatus iviStatus = 0, const std::string& extra = {});
-    std::string BuildIviDescription(ViStatus status, const std::string& extra) const;
+    std::string BuildIviDescription(ViStatus status, std::string_view extra) const;
 
     bool ExceptionOnError() const { return exceptionOnError_; }
     void ExceptionOnError(bool value) { exceptionOnError_ = value; }
@@ -106,6 +116,9 @@ public:
     Event<> SessionClosed;
 
 private:
+    ViStatus ReportStatus(ViStatus status, std::string_view source, std::int32_t flags,
+                          std::string_view extra);
+
     std::int32_t state_ = IviStateClosed;
     ViSession sessionNumber_ = 0;
     std::shared_ptr<SessionManager> SessionMgr_;

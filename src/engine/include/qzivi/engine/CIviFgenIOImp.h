@@ -11,6 +11,7 @@
 #include <initializer_list>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <variant>
 #include <vector>
 
@@ -63,19 +64,24 @@ public:
     Event<std::int32_t, const std::string&, const std::string&> Error;
 
 private:
-    // One parameter of a checked call: what to ask the driver if the call is refused.
+    // One parameter of a checked call: what to ask the driver if the call is refused. Made on
+    // every call, so it copies nothing.
     struct Param {
+        template <typename Number>
+        Param(ViAttr id, AttrType type, Number value, const std::string& owner, const char* name)
+            : id(id), type(type), value(static_cast<double>(value)), owner(owner), name(name) {}
         ViAttr id;
-        AttrType type;
-        Variant value;
-        std::string owner; // Path of the object that owns the property
+        AttrType type; // Boolean, Int32 or Real64
+        double value;
+        const std::string& owner; // Path of the object that owns the property
         const char* name;
     };
 
     void Run(bool internalCall);
     void Checked(ViStatus status, const char* word, const std::string& channel,
                  std::initializer_list<Param> params);
-    void CheckExtensions(std::int32_t extensions, const std::string& capabilities);
+    void CheckExtensions(std::int32_t extensions, std::string_view capabilities);
+    bool CheckNumber(AttrType type, ViAttr id, double value, const char* channel);
     void ClearDeletedHandles();
     void CreateMissingHandles();
     void ConfigureChannel(QZIviFgenChannel& channel, bool& anyTrigger, bool& anyAM, bool& anyFM);
@@ -90,6 +96,8 @@ private:
     bool m_bSeqPrepassDone = false;
     bool m_bArbMemoryCleared = false;
     std::vector<Variant> m_aValidFunctions = std::vector<Variant>(8);
+    std::int32_t m_lCheckedExtensions = -1; // the last extensions the driver was found to offer
+    std::string m_sCheckedCapabilities;
     Connection m_cError, m_cAllError, m_cSessionClosed;
 };
 

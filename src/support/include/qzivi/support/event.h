@@ -46,11 +46,21 @@ public:
     }
 
     void operator()(Args... args) const {
-        // A copy, so that handlers may connect and disconnect while this runs.
-        const auto slots = slots_;
-        for (const auto& slot : slots)
+        if (slots_.empty()) return;
+        // By index, over the handlers there were when it began: a handler may connect more (they
+        // wait for the next time) or end connections (they are skipped, and dropped afterwards).
+        struct Depth {
+            const Event& event;
+            explicit Depth(const Event& e) : event(e) { ++event.depth_; }
+            ~Depth() {
+                if (--event.depth_ == 0) event.Prune();
+            }
+        } depth(*this);
+        const std::size_t count = slots_.size();
+        for (std::size_t i = 0; i < count; ++i) {
+            const Slot* slot = slots_[i].get();
             if (*slot->alive) slot->handler(args...);
-        Prune();
+        }
     }
 
     bool HasHandlers() const {
@@ -68,6 +78,7 @@ private:
         std::erase_if(slots_, [](const std::shared_ptr<Slot>& slot) { return !*slot->alive; });
     }
     mutable std::vector<std::shared_ptr<Slot>> slots_;
+    mutable int depth_ = 0;
 };
 
 } // namespace qzivi
