@@ -69,7 +69,7 @@ void CIviFgenPropImp::UIStyle(std::int32_t value) {
 }
 
 const std::shared_ptr<QZIviConfigurations>& CIviFgenPropImp::Configurations() {
-    m_oConfigurations->SetOwner(this);
+    m_oConfigurations->PropSet(this);
     return m_oConfigurations;
 }
 
@@ -172,6 +172,7 @@ void CIviFgenPropImp::Detach() {
     m_oWaveforms->Attach(m_oErr, nullptr);
     m_oSequences->Attach(m_oErr, nullptr);
     m_oConfigurations->Attach(m_oErr, nullptr, "");
+    m_oConfigurations->PropSet(nullptr);
 }
 
 void CIviFgenPropImp::SetPath(const std::string& name) {

@@ -1,0 +1,171 @@
+#include "qzivi/panels/MUiAndStringUtil.h"
+
+#include "qzivi/support/failure.h"
+#include "qzivi/support/text.h"
+
+#include <charconv>
+#include <cmath>
+
+namespace qzivi {
+
+namespace {
+
+bool IsNumber(std::string_view text) {
+    return text::ParseNumber(text).has_value();
+}
+
+// A value as the system's first language turned numbers into text: at most 15 significant digits.
+std::string Digits(double value) {
+    char buffer[64];
+    const auto [end, error] =
+        std::to_chars(buffer, buffer + sizeof buffer, value, std::chars_format::general, 15);
+    return error == std::errc() ? std::string(buffer, end) : std::string();
+}
+
+struct Prefix {
+    double from;
+    const char* letter;
+    double scale;
+};
+
+constexpr Prefix kPrefixes[] = {
+    {18, "E", 1e-18}, {15, "P", 1e-15}, {12, "T", 1e-12}, {9, "G", 1e-9},
+    {6, "M", 1e-6},   {3, "k", 1e-3},   {0, "", 1},       {-3, "m", 1e3},
+    {-6, "u", 1e6},   {-9, "n", 1e9},   {-12, "p", 1e12}, {-15, "f", 1e15},
+};
+
+} // namespace
+
+double ParseLeadingNumber(std::string_view text) {
+    if (const auto whole = text::ParseNumber(text)) return *whole;
+    if (text.empty()) return 0;
+    std::string_view rest = text;
+    for (std::size_t i = 0; i < text.size(); ++i) {
+        if (text[i] < '0' || text[i] > '9') continue;
+        // A sign or a point just before the digit belongs to the number; a digit in first place
+        // cuts nothing.
+        rest = i > 0 && IsNumber(text.substr(i - 1, 2)) ? text.substr(i - 1) : text.substr(i);
+        break;
+    }
+    for (std::size_t n = rest.size(); n > 0; --n)
+        if (const auto number = text::ParseNumber(rest.substr(0, n))) return *number;
+    return 0;
+}
+
+std::int32_t PrefixExponent(char c) {
+    switch (c) {
+    case 'E':
+        return 18;
+    case 'P':
+        return 15;
+    case 'T':
+        return 12;
+    case 'G':
+        return 9;
+    case 'M':
+        return 6;
+    case 'k':
+        return 3;
+    case 'm':
+        return -3;
+    case 'u':
+        return -6;
+    case 'n':
+        return -9;
+    case 'p':
+        return -12;
+    case 'f':
+        return -15;
+    case 'a':
+        return -18;
+    default:
+        return 0;
+    }
+}
+
+double Log10Abs(double value, bool zeroGivesZero) {
+    if (value == 0) {
+        if (zeroGivesZero) return 0;
+        RaiseRuntime(5, "Invalid procedure call or argument: the logarithm of 0.");
+    }
+    return std::log(std::fabs(value)) / std::log(10.0);
+}
+
+std::string RepeatChar(std::string_view text, std::int32_t count) {
+    if (text.empty() || count < 0) RaiseRuntime(5, "Invalid procedure call or argument.");
+    return std::string(static_cast<std::size_t>(count), text.front());
+}
+
+std::string FormatEngineering(double value, std::int32_t decimals) {
+    const double e = Log10Abs(value, true);
+    const char* letter = "a";
+    double scale = 1e18;
+    for (const auto& p : kPrefixes)
+        if (e >= p.from) {
+            letter = p.letter;
+            scale = p.scale;
+            break;
+        }
+    char number[400];
+    const auto [end, error] = std::to_chars(number, number + sizeof number, value * scale,
+                                            std::chars_format::fixed, std::max(decimals, 0));
+    std::string text = value >= 0 ? " " : "";
+    text.append(number, error == std::errc() ? end : number);
+    return text + " " + letter;
+}
+
+void FormatValueWithUnit(std::string_view input, std::string& text, double& value,
+                         std::string_view unit, std::int32_t decimals) {
+    const double v = ParseLeadingNumber(input);
+    const std::string digits = Digits(v);
+    std::size_t next = !digits.empty() && digits.front() == '0' ? 1 : 0; // 0-based
+    std::int32_t exponent = 0;
+    if (v != 0) {
+        // Find where the number ends in the input, though blanks or a leading zero differ.
+        std::size_t end = std::string_view::npos;
+        for (std::size_t i = 0; i < input.size(); ++i) {
+            if (next < digits.size() && input[i] == digits[next]) ++next;
+            if (next >= digits.size()) {
+                end = i;
+                break;
+            }
+        }
+        if (end != std::string_view::npos && end + 1 < input.size())
+            for (std::size_t i = end; i < input.size() && exponent == 0; ++i)
+                exponent = PrefixExponent(input[i]);
+    }
+    value = v * std::pow(10.0, exponent);
+    text = FormatEngineering(value, decimals).append(unit);
+    if (text.empty() || text.front() != '-') text.erase(0, 1);
+}
+
+ComboChoice SelectComboEntry(const std::vector<ComboEntry>& entries, const Variant& value,
+                             bool asNumbers, bool firstAsFallback) {
+    const auto asText = [&] {
+        return value.IsEmpty() || value.IsMissing() ? std::string() : value.AsText();
+    };
+    if (entries.empty()) return {-1, asText()};
+    ComboChoice choice;
+    if (!value.IsNumber()) {
+        const std::string wanted = asText();
+        for (std::size_t i = 0; i < entries.size() && choice.select < 0; ++i)
+            if (entries[i].text == wanted) choice.select = static_cast<std::int32_t>(i);
+    } else {
+        const double wanted = value.AsDouble();
+        for (std::size_t i = 0; i < entries.size() && choice.select < 0; ++i)
+            if (entries[i].data && *entries[i].data == wanted)
+                choice.select = static_cast<std::int32_t>(i);
+        for (std::size_t i = 0; asNumbers && i < entries.size() && choice.select < 0; ++i)
+            if (ParseLeadingNumber(entries[i].text) == wanted)
+                choice.select = static_cast<std::int32_t>(i);
+    }
+    if (choice.select < 0) {
+        if (firstAsFallback)
+            choice.select = 0;
+        else
+            choice.text = asText();
+    }
+    return choice;
+}
+
+} // namespace qzivi
