@@ -527,5 +527,78 @@ TEST_F(EngineTest, ABurstOfCyclesFollowsTheSoftwareTrigger) {
     EXPECT_EQ(State(), IviStateConfigured);
 }
 
+// ---- Capability queries -------------------------------------------------------------------------
+
+TEST_F(EngineTest, RangesComeFromTheDriverOrFromTheFallbacks) {
+    fgen_->Channels()->Add();
+    Open();
+    auto& io = fgen_->Engine();
+    EXPECT_EQ(io.IviFgenGetRanges(IVIFGEN_ATTR_FUNC_AMPLITUDE, "Channel1"),
+              (std::vector<double>{0.001, 10}));
+    EXPECT_EQ(io.IviFgenGetRanges(IVIFGEN_ATTR_FUNC_FREQUENCY, "Channel1"),
+              (std::vector<double>{1e-6, 50e6}));
+    fgen_->Init(false, false, "DriverSetup=NoRanges=1", qziviCloseAndInit);
+    EXPECT_EQ(io.IviFgenGetRanges(IVIFGEN_ATTR_FUNC_AMPLITUDE, "Channel1"),
+              (std::vector<double>{-10, 10}));
+    EXPECT_EQ(io.IviFgenGetRanges(IVIFGEN_ATTR_ARB_GAIN, "Channel1"),
+              (std::vector<double>{0.1, 5}));
+    EXPECT_EQ(io.IviFgenGetRanges(IVIFGEN_ATTR_FUNC_START_PHASE, "Channel1"),
+              (std::vector<double>{0, 0}))
+        << "no fallback for it";
+    EXPECT_TRUE(errors_.empty() && warnings_.empty()) << "nothing is reported";
+}
+
+TEST_F(EngineTest, ValidFunctionsAskTheDriverAndTheCollections) {
+    fgen_->Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt);
+    fgen_->Channels()->Add();
+    Open("RejectEmptyChannel=1");
+    auto& io = fgen_->Engine();
+    auto values = [](const std::vector<Variant>& table) {
+        std::vector<int> v;
+        for (const auto& entry : table)
+            v.push_back(entry.IsEmpty() ? -1 : entry.AsInt32());
+        return v;
+    };
+    EXPECT_EQ(values(io.IVIFgenGetValidFunctions(true)),
+              (std::vector<int>{-1, -1, -1, -1, -1, -1, 0, 0}))
+        << "kept entries are empty before any first call";
+    EXPECT_EQ(values(io.IVIFgenGetValidFunctions(false)),
+              (std::vector<int>{1, 1, 1, 1, 1, 1, 0, 0}))
+        << "channel \"1\" answers where \"\" is refused; no waveforms, no sequences yet";
+    fgen_->Waveforms()->Add("W");
+    fgen_->Sequences()->Add("S");
+    EXPECT_EQ(values(io.IVIFgenGetValidFunctions(true)),
+              (std::vector<int>{1, 1, 1, 1, 1, 1, 1, 1}));
+    fgen_->Init(false, false,
+                "DriverSetup=Fail=CheckAttributeViInt32:0xBFFA0011; Groups=IviFgenBase",
+                qziviCloseAndInit);
+    EXPECT_EQ(values(io.IVIFgenGetValidFunctions(false)),
+              (std::vector<int>{1, 1, 1, 1, 1, 1, 0, 0}))
+        << "a check the driver lacks counts as taken; without the groups no arbitrary output";
+    fgen_->Extensions(qzivifgenArbWfmExt);
+    EXPECT_EQ(values(io.IVIFgenGetValidFunctions(false)),
+              (std::vector<int>{0, 0, 0, 0, 0, 0, 0, 0}));
+}
+
+TEST_F(EngineTest, AttributesReadInEveryTypeAndReadFailuresRaise) {
+    fgen_->Channels()->Add();
+    Open();
+    auto& io = fgen_->Engine();
+    EXPECT_EQ(io.GetAttributeVi(AttrType::String, IVI_ATTR_SPECIFIC_DRIVER_PREFIX, "").AsText(),
+              "QZSimFgen");
+    EXPECT_EQ(io.GetAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, "Channel1").AsInt32(),
+              1);
+    EXPECT_EQ(io.GetAttributeVi(AttrType::Boolean, IVI_ATTR_SIMULATE, "").AsInt32(), 1);
+    EXPECT_EQ(
+        io.GetAttributeVi(AttrType::Real64, IVIFGEN_ATTR_OUTPUT_IMPEDANCE, "Channel2").AsDouble(),
+        50);
+    EXPECT_TRUE(
+        io.CheckAttributeVi(AttrType::Real64, IVIFGEN_ATTR_FUNC_FREQUENCY, 2e7, "Channel1"));
+    EXPECT_FALSE(
+        io.CheckAttributeVi(AttrType::Real64, IVIFGEN_ATTR_FUNC_FREQUENCY, 2e8, "Channel1"));
+    EXPECT_EQ(Raised([&] { io.GetAttributeVi(AttrType::Int32, 1259999, ""); }), -30712);
+    EXPECT_EQ(lastRaised_->Source(), ".GetAttribute");
+}
+
 } // namespace
 } // namespace qzivi

@@ -3,49 +3,10 @@
 #include "qzivi/model/PropertyBag.h"
 #include "tree_fixture.h"
 
-#include <sstream>
-
 namespace qzivi {
 namespace {
 
-// Everything a user set in a tree, as text, references by name.
-std::string Describe(CIviFgenPropImp& t) {
-    std::ostringstream o;
-    o << t.ArbSampleRate() << ' ' << t.AutoStopStart() << ' ' << t.Extensions() << ' '
-      << t.OutputMode() << ' ' << t.RefClockSource() << ' ' << t.LogicalName() << ' '
-      << t.AutoConfigure() << ' ' << t.Enabled() << ' ' << t.UIStyle() << ' '
-      << t.ExceptionOnError() << '\n';
-    const auto& in = *t.Internal();
-    o << in.AMInternalDepth() << ' ' << in.AMInternalFrequency() << ' ' << in.AMInternalWaveform()
-      << ' ' << in.FMInternalDeviation() << ' ' << in.FMInternalFrequency() << ' '
-      << in.FMInternalWaveform() << ' ' << in.InternalTriggerRate() << '\n';
-    for (const auto& c : *t.Channels())
-        o << "channel " << c->Name() << ' ' << c->AMEnabled() << ' ' << c->AMSource() << ' '
-          << c->ArbFrequency() << ' ' << c->ArbGain() << ' ' << c->ArbOffset() << ' '
-          << (c->ArbWaveform() ? c->ArbWaveform()->Name() : "-") << ' ' << c->BurstCount() << ' '
-          << c->FMEnabled() << ' ' << c->FMSource() << ' ' << c->FuncAmplitude() << ' '
-          << c->FuncDCOffset() << ' ' << c->FuncDutyCycleHigh() << ' ' << c->FuncFrequency() << ' '
-          << c->FuncStartPhase() << ' ' << c->FuncWaveform() << ' ' << c->OperationMode() << ' '
-          << c->OutputEnabled() << ' ' << c->OutputImpedance() << ' '
-          << (c->Sequence() ? c->Sequence()->Name() : "-") << ' ' << c->TriggerSource() << '\n';
-    for (const auto& w : *t.Waveforms()) {
-        o << "waveform " << w->Name() << ' ' << w->Source() << ' ' << w->Filename() << ' '
-          << w->AutoNormalizeMode() << ' ' << w->PersistedWfmSource() << ' ' << w->DataSize()
-          << ':';
-        if (const auto points = w->Data())
-            for (double p : *points)
-                o << ' ' << p;
-        o << '\n';
-    }
-    for (const auto& s : *t.Sequences()) {
-        o << "sequence " << s->Name();
-        for (const auto& item : *s)
-            o << " (" << (item->Waveform() ? item->Waveform()->Name() : "-") << " x"
-              << item->Iterations() << ')';
-        o << '\n';
-    }
-    return o.str();
-}
+using test::Describe;
 
 class PersistenceTest : public test::TreeTest {
 protected:

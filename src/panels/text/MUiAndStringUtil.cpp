@@ -88,7 +88,8 @@ double Log10Abs(double value, bool zeroGivesZero) {
         if (zeroGivesZero) return 0;
         RaiseRuntime(5, "Invalid procedure call or argument: the logarithm of 0.");
     }
-    return std::log(std::fabs(value)) / std::log(10.0);
+    // log10 lands on the integer for powers of ten, so 1e6 is 1 M and not 1000 k.
+    return std::log10(std::fabs(value));
 }
 
 std::string RepeatChar(std::string_view text, std::int32_t count) {

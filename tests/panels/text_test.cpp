@@ -1,0 +1,104 @@
+// The text helpers: typed texts to values and values to texts with units and prefixes.
+#include "qzivi/panels/MUiAndStringUtil.h"
+#include "qzivi/support/failure.h"
+
+#include <gtest/gtest.h>
+
+#include <clocale>
+#include <cmath>
+
+namespace qzivi {
+namespace {
+
+struct Formatted {
+    std::string text;
+    double value;
+};
+
+Formatted Format(const std::string& input, const std::string& unit, int decimals) {
+    Formatted f;
+    FormatValueWithUnit(input, f.text, f.value, unit, decimals);
+    return f;
+}
+
+TEST(FormatValueWithUnit, GivesTheExamples) {
+    struct Case {
+        const char* input;
+        const char* unit;
+        int decimals;
+        double value;
+        const char* text;
+    };
+    for (const auto& c :
+         {Case{"2.5 k", "Hz", 6, 2500, "2.500000 kHz"}, Case{"0.25", "V", 2, 0.25, "250.00 mV"},
+          Case{"1500", "V", 2, 1500, "1.50 kV"}, Case{"-3 m", "V", 2, -0.003, "-3.00 mV"},
+          Case{"50", "%", 2, 50, "50.00 %"}, Case{"1 M", "Hz", 3, 1e6, "1.000 MHz"},
+          Case{"1 m", "Hz", 3, 1e-3, "1.000 mHz"}, Case{"  12.5 Volts", "V", 1, 12.5, "12.5 V"},
+          Case{".25", "V", 2, 0.25, "250.00 mV"}, Case{"0", "V", 2, 0, "0.00 V"}}) {
+        SCOPED_TRACE(c.input);
+        const auto f = Format(c.input, c.unit, c.decimals);
+        EXPECT_DOUBLE_EQ(f.value, c.value);
+        EXPECT_EQ(f.text, c.text);
+    }
+    EXPECT_DOUBLE_EQ(Format("5 Amp", "A", 2).value, 5e-3) << "a prefix letter inside a word counts";
+    EXPECT_DOUBLE_EQ(Format("7 Hz", "Hz", 2).value, 7) << "a typed unit is skipped";
+}
+
+TEST(ParseLeadingNumber, ReadsTheNumberAtTheStart) {
+    EXPECT_EQ(ParseLeadingNumber("  12.5 V"), 12.5);
+    EXPECT_EQ(ParseLeadingNumber("volts"), 0);
+    EXPECT_EQ(ParseLeadingNumber(""), 0);
+    EXPECT_EQ(ParseLeadingNumber("-5x"), -5);
+    EXPECT_EQ(ParseLeadingNumber("-.5"), -0.5);
+    EXPECT_EQ(ParseLeadingNumber("x-.5"), 0.5)
+        << "only one character before the digit is looked at";
+    EXPECT_EQ(ParseLeadingNumber("1e3 Hz"), 1000);
+}
+
+TEST(FormatEngineering, PicksThePrefixByTheComputedLogarithm) {
+    EXPECT_EQ(FormatEngineering(0, 2), " 0.00 ");
+    EXPECT_EQ(FormatEngineering(2.5e9, 1), " 2.5 G");
+    EXPECT_EQ(FormatEngineering(-4.7e-7, 0), "-470 n");
+    EXPECT_EQ(FormatEngineering(3e-17, 1), " 30.0 a");
+    EXPECT_EQ(FormatEngineering(3e-20, 1), " 0.0 a") << "below atto the scale stays";
+    EXPECT_EQ(FormatEngineering(1000, 2), " 1.00 k") << "a power of ten takes its own prefix";
+    EXPECT_EQ(FormatEngineering(1e19, 1), " 10.0 E");
+    EXPECT_EQ(PrefixExponent('k'), 3);
+    EXPECT_EQ(PrefixExponent('K'), 0) << "case matters";
+    EXPECT_EQ(PrefixExponent('u'), -6);
+    EXPECT_EQ(Log10Abs(0, true), 0);
+    EXPECT_THROW(Log10Abs(0, false), Failure);
+    EXPECT_EQ(RepeatChar("xyz", 3), "xxx");
+}
+
+TEST(FormatEngineering, ReadsBackTheSameUnderAnyLocale) {
+    const char* previous = std::setlocale(LC_NUMERIC, nullptr);
+    const std::string saved = previous != nullptr ? previous : "C";
+    const bool german = std::setlocale(LC_NUMERIC, "de_DE.UTF-8") != nullptr;
+    for (double v : {1234.5678, -0.000321, 5e7, 42.0}) {
+        const std::string text = FormatEngineering(v, 6);
+        EXPECT_EQ(text.find(','), std::string::npos) << text;
+        EXPECT_NEAR(Format(text, "", 6).value, v, std::fabs(v) * 1e-6);
+    }
+    std::setlocale(LC_NUMERIC, saved.c_str());
+    if (!german)
+        GTEST_LOG_(INFO) << "no German locale here; the text was checked under the C locale";
+}
+
+TEST(SelectComboEntry, ChoosesByTextDataOrNumber) {
+    const std::vector<ComboEntry> waveforms = {{"Sine", 1}, {"Square", 2}, {"DC", 6}};
+    EXPECT_EQ(SelectComboEntry(waveforms, 6, false, false).select, 2) << "by item data";
+    EXPECT_EQ(SelectComboEntry(waveforms, "Square", false, false).select, 1) << "by text";
+    const auto none = SelectComboEntry(waveforms, 9, false, false);
+    EXPECT_EQ(none.select, -1);
+    EXPECT_EQ(none.text, "9");
+    EXPECT_EQ(SelectComboEntry(waveforms, 9, false, true).select, 0) << "the first as fallback";
+    const std::vector<ComboEntry> rates = {{"100 Hz", std::nullopt}, {"1000 Hz", std::nullopt}};
+    EXPECT_EQ(SelectComboEntry(rates, 1000, true, false).select, 1) << "as numbers";
+    EXPECT_EQ(SelectComboEntry(rates, 1000, false, false).select, -1);
+    EXPECT_EQ(SelectComboEntry({}, "free", false, true).text, "free")
+        << "an empty list takes the text";
+}
+
+} // namespace
+} // namespace qzivi
