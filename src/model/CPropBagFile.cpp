@@ -129,10 +129,10 @@ void CPropBagFile::LoadPropBagFile(const std::string& path, const std::string& i
     if (count < 0 || static_cast<std::uint64_t>(count) > length - header)
         Improper("The file \"" + path + "\" claims " + std::to_string(count) +
                  " bytes of contents but holds " + std::to_string(length - header) + ".");
-    Bytes contents(static_cast<std::size_t>(count));
-    ReadExactly(file.fd, contents.data(), contents.size(), path);
+    auto contents = std::make_shared<Bytes>(static_cast<std::size_t>(count));
+    ReadExactly(file.fd, contents->data(), contents->size(), path);
     try {
-        bag->SetContents(contents);
+        bag->SetContents(SharedBytes(std::move(contents), 0, static_cast<std::size_t>(count)));
     } catch (Failure& f) {
         throw Failure(f.Number(), kLoad, f.Description());
     }
@@ -142,28 +142,46 @@ void CPropBagFile::LoadPropBagFile(const std::string& path, const std::string& i
 void CPropBagFile::SavePropBagFile() {
     if (!m_bDirty) return;
     const std::string& path = m_sFilePath;
-    const Bytes contents = m_oBag ? m_oBag->Contents() : Bytes();
-    // A block that only says "no values" is no content.
+    // A bag without values is no content: the file ends after the identifier.
     const bool empty = !m_oBag || m_oBag->Size() == 0;
+    std::size_t count = 0;
+    if (!empty) m_oBag->WriteContents([&](const void*, std::size_t size) { count += size; });
+    if (count > 0x7FFFFFFF)
+        RaiseRuntime(runtime::kOverflow, "The configuration is too large for its file.", kSave);
     const std::string temporary = path + ".tmp-" + std::to_string(::getpid());
     Fd file;
     file.fd = ::open(temporary.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC, 0644);
     if (file.fd < 0) FileFailure(kSave, temporary, "cannot be created");
     try {
-        WriteAll(file.fd, m_sFileIdentifier.data(), m_sFileIdentifier.size(), temporary);
+        // Small pieces gather here; large ones go straight to the file.
+        Bytes pending;
+        pending.reserve(1 << 16);
+        auto flush = [&] {
+            WriteAll(file.fd, pending.data(), pending.size(), temporary);
+            pending.clear();
+        };
+        auto sink = [&](const void* data, std::size_t size) {
+            if (pending.size() + size > pending.capacity()) flush();
+            if (size >= pending.capacity()) {
+                WriteAll(file.fd, data, size, temporary);
+                return;
+            }
+            const auto* bytes = static_cast<const std::uint8_t*>(data);
+            pending.insert(pending.end(), bytes, bytes + size);
+        };
+        sink(m_sFileIdentifier.data(), m_sFileIdentifier.size());
         if (!empty) {
-            if (contents.size() > 0x7FFFFFFF)
-                RaiseRuntime(runtime::kOverflow, "The configuration is too large.", kSave);
-            const auto count = static_cast<std::int32_t>(contents.size());
-            const std::int32_t highest = count - 1, lowerBound = 0;
+            const auto total = static_cast<std::int32_t>(count);
+            const std::int32_t highest = total - 1, lowerBound = 0;
             const std::uint16_t tag = kByteArrayTag, dimensions = 1;
-            WriteAll(file.fd, &highest, sizeof highest, temporary);
-            WriteAll(file.fd, &tag, sizeof tag, temporary);
-            WriteAll(file.fd, &dimensions, sizeof dimensions, temporary);
-            WriteAll(file.fd, &count, sizeof count, temporary);
-            WriteAll(file.fd, &lowerBound, sizeof lowerBound, temporary);
-            WriteAll(file.fd, contents.data(), contents.size(), temporary);
+            sink(&highest, sizeof highest);
+            sink(&tag, sizeof tag);
+            sink(&dimensions, sizeof dimensions);
+            sink(&total, sizeof total);
+            sink(&lowerBound, sizeof lowerBound);
+            m_oBag->WriteContents(sink);
         }
+        flush();
         if (::fsync(file.fd) != 0) FileFailure(kSave, temporary, "cannot be flushed");
         ::close(file.fd);
         file.fd = -1;

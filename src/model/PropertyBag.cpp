@@ -39,24 +39,22 @@ Variant AsVariant(const PropertyBag::Value& value, std::string_view name) {
 
 class Writer {
 public:
-    void Raw(const void* data, std::size_t size) {
-        const auto* bytes = static_cast<const std::uint8_t*>(data);
-        out_.insert(out_.end(), bytes, bytes + size);
-    }
+    explicit Writer(const std::function<void(const void*, std::size_t)>& sink) : sink_(sink) {}
+    void Raw(const void* data, std::size_t size) { sink_(data, size); }
     template <typename T>
     void Put(T value) {
         Raw(&value, sizeof value);
     }
-    Bytes Take() { return std::move(out_); }
 
 private:
-    Bytes out_;
+    const std::function<void(const void*, std::size_t)>& sink_;
 };
 
 // Reads the block; every length is held against what remains before anything is allocated.
 class Reader {
 public:
     explicit Reader(std::span<const std::uint8_t> block) : block_(block) {}
+    std::size_t At() const { return at_; }
     std::size_t Remaining() const { return block_.size() - at_; }
     template <typename T>
     T Get(const char* what) {
@@ -88,6 +86,16 @@ private:
 };
 
 } // namespace
+
+SharedBytes::SharedBytes(Bytes bytes)
+    : owner_(std::make_shared<const Bytes>(std::move(bytes))), offset_(0), size_(owner_->size()) {}
+
+SharedBytes::SharedBytes(std::shared_ptr<const Bytes> owner, std::size_t offset, std::size_t size)
+    : owner_(std::move(owner)), offset_(offset), size_(size) {}
+
+bool operator==(const SharedBytes& a, const SharedBytes& b) {
+    return a.size_ == b.size_ && (a.size_ == 0 || std::memcmp(a.data(), b.data(), a.size_) == 0);
+}
 
 const PropertyBag::Value* PropertyBag::Find(std::string_view name) const {
     const auto found = index_.find(text::Lower(name));
@@ -142,9 +150,13 @@ std::string PropertyBag::ReadText(std::string_view name, std::string_view defaul
 }
 
 Bytes PropertyBag::ReadBytes(std::string_view name) const {
+    return ReadSharedBytes(name).ToBytes();
+}
+
+SharedBytes PropertyBag::ReadSharedBytes(std::string_view name) const {
     const Value* value = Find(name);
     if (value == nullptr) return {};
-    if (const auto* bytes = std::get_if<Bytes>(value)) return *bytes;
+    if (const auto* bytes = std::get_if<SharedBytes>(value)) return *bytes;
     WrongType(name);
 }
 
@@ -170,11 +182,24 @@ void PropertyBag::WriteText(std::string_view name, std::string_view value) {
 }
 
 void PropertyBag::WriteBytes(std::string_view name, Bytes value) {
+    Store(name, SharedBytes(std::move(value)));
+}
+
+void PropertyBag::WriteBytes(std::string_view name, SharedBytes value) {
     Store(name, std::move(value));
 }
 
 Bytes PropertyBag::Contents() const {
-    Writer w;
+    Bytes out;
+    WriteContents([&](const void* data, std::size_t size) {
+        const auto* bytes = static_cast<const std::uint8_t*>(data);
+        out.insert(out.end(), bytes, bytes + size);
+    });
+    return out;
+}
+
+void PropertyBag::WriteContents(const std::function<void(const void*, std::size_t)>& sink) const {
+    Writer w(sink);
     w.Raw(kMagic, sizeof kMagic);
     w.Put(kVersion);
     w.Put(static_cast<std::uint32_t>(entries_.size()));
@@ -202,7 +227,7 @@ Bytes PropertyBag::Contents() const {
             break;
         }
         default: {
-            const auto& bytes = std::get<Bytes>(value);
+            const auto& bytes = std::get<SharedBytes>(value);
             w.Put(kBytes);
             w.Put(static_cast<std::uint32_t>(bytes.size()));
             w.Raw(bytes.data(), bytes.size());
@@ -210,11 +235,14 @@ Bytes PropertyBag::Contents() const {
         }
         }
     }
-    return w.Take();
 }
 
 void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
-    Reader r(block);
+    SetContents(SharedBytes(Bytes(block.begin(), block.end())));
+}
+
+void PropertyBag::SetContents(const SharedBytes& shared) {
+    Reader r(shared.span());
     const auto magic = r.Take(sizeof kMagic, "the identifier");
     if (std::memcmp(magic.data(), kMagic, sizeof kMagic) != 0)
         r.Corrupt("it does not start with \"QZPB\"");
@@ -252,8 +280,8 @@ void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
         }
         case kBytes: {
             const auto size = r.Get<std::uint32_t>("a byte array length");
-            const auto bytes = r.Take(size, "a byte array");
-            bag.Store(name, Bytes(bytes.begin(), bytes.end()));
+            r.Take(size, "a byte array");
+            bag.Store(name, shared.Slice(r.At() - size, size));
             break;
         }
         default:

@@ -72,7 +72,7 @@ void QZIviConfiguration::Store() {
 }
 
 void QZIviConfiguration::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
-    Bytes snapshot = bag.ReadBytes(prefix + "Bag");
+    SharedBytes snapshot = bag.ReadSharedBytes(prefix + "Bag");
     // A snapshot that is no bag is refused now, before it replaces the one held.
     if (!snapshot.empty()) PropertyBag().SetContents(snapshot);
     m_aBag = std::move(snapshot);
@@ -141,7 +141,7 @@ std::shared_ptr<QZIviConfiguration> QZIviConfigurations::Add(const std::string& 
         } else {
             PropertyBag snapshot;
             if (m_oSourceSet) m_oSourceSet->WriteProperties(snapshot, "", false);
-            item->Bag(snapshot.Contents());
+            item->Bag(SharedBytes(snapshot.Contents()));
         }
         item->SetName(Name);
         item->SetPath(m_sPath);
@@ -182,7 +182,7 @@ void QZIviConfigurations::StoreConfiguration(const Variant& index) {
         RaiseRuntime(91, "Object variable not set: the configurations belong to no property set.");
     PropertyBag snapshot;
     m_oPropSet->WriteProperties(snapshot, "", false);
-    item->Bag(snapshot.Contents());
+    item->Bag(SharedBytes(snapshot.Contents()));
 }
 
 std::int32_t QZIviConfigurations::IndexOfObject(const QZIviConfiguration* object) const {

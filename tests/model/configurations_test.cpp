@@ -94,7 +94,7 @@ TEST_F(ConfigurationsTest, TheFileKeepsItsLayoutByteForByte) {
     bag.SetContents(
         std::span(reinterpret_cast<const std::uint8_t*>(file.data()) + 25, file.size() - 25));
     EXPECT_EQ(bag.Size(), 1u);
-    EXPECT_EQ(bag.ReadBytes("Bag"), a->Bag());
+    EXPECT_EQ(bag.ReadSharedBytes("Bag"), a->Bag());
 }
 
 TEST_F(ConfigurationsTest, ItemTakesNamesAsTextAndRemoveTakesPositions) {

@@ -12,6 +12,8 @@
 #include "qzivi/support/variant.h"
 
 #include <cstdint>
+#include <functional>
+#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
@@ -23,9 +25,34 @@ namespace qzivi {
 
 using Bytes = std::vector<std::uint8_t>;
 
+// A run of bytes inside a shared buffer: large values are passed on and parsed in place, never
+// copied on the way.
+class SharedBytes {
+public:
+    SharedBytes() = default;
+    explicit SharedBytes(Bytes bytes);
+    SharedBytes(std::shared_ptr<const Bytes> owner, std::size_t offset, std::size_t size);
+
+    const std::uint8_t* data() const { return owner_ ? owner_->data() + offset_ : nullptr; }
+    std::size_t size() const { return size_; }
+    bool empty() const { return size_ == 0; }
+    std::span<const std::uint8_t> span() const { return {data(), size_}; }
+    Bytes ToBytes() const { return Bytes(data(), data() + size_); }
+    // The same run, narrowed.
+    SharedBytes Slice(std::size_t offset, std::size_t size) const {
+        return {owner_, offset_ + offset, size};
+    }
+    friend bool operator==(const SharedBytes& a, const SharedBytes& b);
+
+private:
+    std::shared_ptr<const Bytes> owner_;
+    std::size_t offset_ = 0;
+    std::size_t size_ = 0;
+};
+
 class PropertyBag {
 public:
-    using Value = std::variant<std::int32_t, double, bool, std::string, Bytes>;
+    using Value = std::variant<std::int32_t, double, bool, std::string, SharedBytes>;
 
     // Names ignore case. A stored value of another kind converts as the system's values do: a
     // text that is no number read as a number raises the wrong-type failure (13).
@@ -33,7 +60,8 @@ public:
     double ReadDouble(std::string_view name, double defaultValue) const;
     bool ReadBool(std::string_view name, bool defaultValue) const;
     std::string ReadText(std::string_view name, std::string_view defaultValue) const;
-    Bytes ReadBytes(std::string_view name) const; // empty when missing
+    Bytes ReadBytes(std::string_view name) const;             // empty when missing
+    SharedBytes ReadSharedBytes(std::string_view name) const; // the same, without a copy
 
     void WriteInt32(std::string_view name, std::int32_t value, std::int32_t defaultValue);
     void WriteDouble(std::string_view name, double value, double defaultValue);
@@ -42,15 +70,21 @@ public:
     // Always stored, as a text written with no default is.
     void WriteText(std::string_view name, std::string_view value);
     void WriteBytes(std::string_view name, Bytes value);
+    void WriteBytes(std::string_view name, SharedBytes value);
 
     bool Contains(std::string_view name) const;
     std::size_t Size() const { return entries_.size(); }
     void Clear();
 
     Bytes Contents() const;
+    // The same bytes, handed piece by piece to `sink`, so that a large bag is written out without
+    // being gathered first.
+    void WriteContents(const std::function<void(const void*, std::size_t)>& sink) const;
     // Replaces everything by what the block holds. A block that is not one gives the improper-file
     // failure (60040) with what is wrong, and leaves the bag as it was.
     void SetContents(std::span<const std::uint8_t> block);
+    // The same for a shared block, whose byte values stay in it.
+    void SetContents(const SharedBytes& block);
 
     friend bool operator==(const PropertyBag& a, const PropertyBag& b);
 

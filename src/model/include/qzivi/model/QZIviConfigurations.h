@@ -32,8 +32,8 @@ public:
     void SetPath(const std::string& parentPath);
     void SetName(const std::string& name) { m_sName = name; }
     void Clone(QZIviConfiguration& target) const;
-    const Bytes& Bag() const { return m_aBag; }
-    void Bag(Bytes contents) { m_aBag = std::move(contents); }
+    const SharedBytes& Bag() const { return m_aBag; }
+    void Bag(SharedBytes contents) { m_aBag = std::move(contents); }
     void ReadProperties(const PropertyBag& bag, const std::string& prefix);
     void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
     bool Importing() const { return m_bImporting; }
@@ -41,7 +41,7 @@ public:
 
 private:
     std::string m_sName;
-    Bytes m_aBag; // the snapshot's Contents
+    SharedBytes m_aBag; // the snapshot's Contents
     std::shared_ptr<CIviErrorReport> m_oErr;
     QZIviConfigurations* m_oParent = nullptr; // the collection that holds this one
     std::string m_sPath;
