@@ -1,65 +1,124 @@
-// qzfgen: opens a function generator by its logical name, configures a sine through the IviFgen
-// class driver, starts it, and prints the driver calls and what the output carries.
+// qzfgen: configures a function generator through the QZIviFgen control, from a saved .qzc
+// configuration or from a built-in two-channel example, and prints the driver calls it made and
+// what the outputs then carry.
 #include "IviFgen.h"
+#include "qzivi/control/QZIviFgen.h"
+#include "qzivi/support/failure.h"
 #include "qzivi/trace.h"
 
+#include <cmath>
 #include <cstdio>
+#include <cstring>
 #include <string>
 #include <vector>
 
 namespace {
 
-bool Check(ViSession vi, ViStatus status, const char* what) {
-    if (status >= 0) return true;
-    ViStatus code = 0;
-    ViChar text[1024] = {};
-    IviFgen_GetError(vi, &code, sizeof text, text);
-    std::fprintf(stderr, "qzfgen: %s failed: %s\n", what, text);
-    return false;
+struct Options {
+    std::string logicalName = "SampleFGen";
+    std::string load;
+    std::string save;
+    bool quiet = false;
+};
+
+void Usage(std::FILE* out) {
+    std::fprintf(
+        out,
+        "usage: qzfgen [--logical-name NAME] [--load FILE.qzc] [--save FILE.qzc] [--quiet]\n"
+        "Configures the generator (default \"SampleFGen\", the built-in simulator) from FILE.qzc,\n"
+        "or from a built-in example of two channels, then prints the driver calls and samples.\n"
+        "--save writes the configuration that was sent to FILE.qzc.\n");
+}
+
+bool Parse(int argc, char** argv, Options& options) {
+    for (int i = 1; i < argc; ++i) {
+        const std::string arg = argv[i];
+        auto value = [&](std::string& into) {
+            if (i + 1 >= argc) return false;
+            into = argv[++i];
+            return true;
+        };
+        if (arg == "--logical-name" && value(options.logicalName)) continue;
+        if (arg == "--load" && value(options.load)) continue;
+        if (arg == "--save" && value(options.save)) continue;
+        if (arg == "--quiet") {
+            options.quiet = true;
+            continue;
+        }
+        return false;
+    }
+    return true;
+}
+
+// The built-in example: a sine on one channel, a square on the other.
+void Example(qzivi::QZIviFgen& fgen) {
+    const auto sine = fgen.Channels()->Add();
+    sine->FuncFrequency(1000);
+    sine->FuncAmplitude(2);
+    const auto square = fgen.Channels()->Add();
+    square->FuncWaveform(qzivi::qzivifgenWaveformSquare);
+    square->FuncFrequency(2500);
+    square->FuncAmplitude(1);
+    square->FuncDCOffset(0.5);
 }
 
 } // namespace
 
 int main(int argc, char** argv) {
-    if (argc > 2 ||
-        (argc == 2 && (std::string(argv[1]) == "-h" || std::string(argv[1]) == "--help"))) {
-        std::printf(
-            "usage: qzfgen [logical-name]\n"
-            "Opens the generator (default \"SampleFGen\", the built-in simulator), configures a\n"
-            "1 kHz sine of 2 Vpp on Channel1, starts it and prints the driver calls and "
-            "samples.\n");
-        return argc > 2 ? 2 : 0;
+    Options options;
+    if (!Parse(argc, argv, options)) {
+        Usage(stderr);
+        return 2;
     }
-    const char* logicalName = argc == 2 ? argv[1] : "SampleFGen";
-    qzivi::ivi::SetTraceSink([](const qzivi::ivi::TraceRecord& record) {
-        std::printf("  %s\n", record.Line().c_str());
-    });
+    qzivi::QZIviFgen fgen;
+    fgen.InitProperties();
+    fgen.ExceptionOnError(true);
+    try {
+        if (!options.load.empty())
+            fgen.Configurations()->Add("loaded", options.load)->Load();
+        else
+            Example(fgen);
+        fgen.LogicalName(options.logicalName);
 
-    std::printf("Driver calls:\n");
-    ViSession vi = 0;
-    if (!Check(VI_NULL, IviFgen_InitWithOptions(logicalName, VI_FALSE, VI_TRUE, "", &vi),
-               "opening the session"))
+        if (!options.quiet)
+            qzivi::ivi::SetTraceSink(
+                [](const qzivi::ivi::TraceRecord& r) { std::printf("  %s\n", r.Line().c_str()); });
+        std::printf("Driver calls of Init and Configure on \"%s\":\n", options.logicalName.c_str());
+        fgen.Init();
+        fgen.Configure();
+        qzivi::ivi::SetTraceSink({});
+
+        if (!options.save.empty()) {
+            fgen.Configurations()->Add("saved")->Export(options.save);
+            std::printf("\nSaved the configuration to %s\n", options.save.c_str());
+        }
+
+        // A table of what each channel carries, 16 samples over 1 ms.
+        const auto vi = static_cast<ViSession>(fgen.SessionHandle());
+        std::printf("\n  t [us]");
+        for (const auto& channel : *fgen.Channels())
+            std::printf("  %10s", channel->Name().c_str());
+        std::printf("\n");
+        std::vector<std::vector<double>> volts;
+        for (const auto& channel : *fgen.Channels()) {
+            std::vector<double> v(16);
+            if (QZIvi_RenderOutput(vi, channel->Name().c_str(), 0.0, 62.5e-6, 16, v.data()) !=
+                VI_SUCCESS)
+                std::fill(v.begin(), v.end(), std::nan(""));
+            volts.push_back(std::move(v));
+        }
+        for (int k = 0; k < 16; ++k) {
+            std::printf("  %6.1f", 62.5 * k);
+            for (const auto& v : volts)
+                std::printf("  %+9.4f V", v[static_cast<std::size_t>(k)]);
+            std::printf("\n");
+        }
+        fgen.CloseSession();
+    } catch (const qzivi::Failure& f) {
+        qzivi::ivi::SetTraceSink({});
+        std::fprintf(stderr, "qzfgen: %s (error %d, %s)\n", f.Description().c_str(), f.Number(),
+                     f.Source().c_str());
         return 1;
-    const char* channel = "Channel1";
-    const bool ok =
-        Check(vi, IviFgen_ConfigureOutputMode(vi, IVIFGEN_VAL_OUTPUT_FUNC), "output mode") &&
-        Check(vi, IviFgen_ConfigureOperationMode(vi, channel, IVIFGEN_VAL_OPERATE_CONTINUOUS),
-              "operation mode") &&
-        Check(vi,
-              IviFgen_ConfigureStandardWaveform(vi, channel, IVIFGEN_VAL_WFM_SINE, 2.0, 0.0, 1000.0,
-                                                0.0),
-              "sine") &&
-        Check(vi, IviFgen_ConfigureOutputEnabled(vi, channel, VI_TRUE), "output") &&
-        Check(vi, IviFgen_InitiateGeneration(vi), "start");
-    std::vector<ViReal64> volts(9);
-    const bool rendered =
-        ok && Check(vi, QZIvi_RenderOutput(vi, channel, 0.0, 125e-6, 9, volts.data()), "rendering");
-    IviFgen_close(vi);
-    qzivi::ivi::SetTraceSink({});
-    if (!rendered) return 1;
-
-    std::printf("\n%s carries (1 kHz sine, 2 Vpp), one sample every 125 us:\n", channel);
-    for (size_t k = 0; k < volts.size(); ++k)
-        std::printf("  t = %6.1f us   %+.4f V\n", 125.0 * k, volts[k]);
+    }
     return 0;
 }
