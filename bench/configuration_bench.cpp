@@ -29,7 +29,8 @@ struct Fixture {
         tree->Attach(err);
         tree->InitProperties();
         std::vector<double> points(10'000'000);
-        for (std::size_t i = 0; i < points.size(); ++i) points[i] = std::sin(double(i) * 0.001);
+        for (std::size_t i = 0; i < points.size(); ++i)
+            points[i] = std::sin(double(i) * 0.001);
         tree->Waveforms()->Add("Big")->Data(std::move(points));
         config = tree->Configurations()->Add("Snapshot");
         dir = fs::temp_directory_path() / ("qzivi-config-bench-" + std::to_string(::getpid()));
@@ -48,7 +49,8 @@ Fixture& The() {
 
 void BM_Export(benchmark::State& state) {
     auto& f = The();
-    for (auto _ : state) f.config->Export(f.qzc);
+    for (auto _ : state)
+        f.config->Export(f.qzc);
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(fs::file_size(f.qzc)));
 }
 
@@ -64,12 +66,17 @@ void PlainWrite(benchmark::State& state, bool sync) {
     }
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(bytes.size()));
 }
-void BM_PlainWrite(benchmark::State& state) { PlainWrite(state, false); }
-void BM_PlainWriteAndSync(benchmark::State& state) { PlainWrite(state, true); }
+void BM_PlainWrite(benchmark::State& state) {
+    PlainWrite(state, false);
+}
+void BM_PlainWriteAndSync(benchmark::State& state) {
+    PlainWrite(state, true);
+}
 
 void BM_Import(benchmark::State& state) {
     auto& f = The();
-    for (auto _ : state) f.config->Import(f.qzc);
+    for (auto _ : state)
+        f.config->Import(f.qzc);
     state.SetBytesProcessed(state.iterations() * static_cast<std::int64_t>(fs::file_size(f.qzc)));
 }
 

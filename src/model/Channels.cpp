@@ -249,47 +249,4 @@ void QZIviFgenChannels::ActiveChannel(const std::shared_ptr<QZIviFgenChannel>& v
     });
 }
 
-void QZIviFgenChannels::Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                               const std::shared_ptr<CIviFgenPropImp>& propSet) {
-    m_oErr = std::move(errorReport);
-    m_oPropSet = propSet;
-    for (const auto& channel : items_)
-        channel->Attach(m_oErr, propSet);
-}
-
-void QZIviFgenChannels::SetPath(const std::string& parentPath) {
-    m_sPath = JoinPath(parentPath, "Channels");
-    for (const auto& channel : items_)
-        channel->SetPath(m_sPath);
-}
-
-void QZIviFgenChannels::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
-    const std::string p = BagPrefix(prefix, "Channels");
-    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
-    if (count <= 0) return;
-    CheckItemCount(count, bag.Size(), p + "ItemCount");
-    items_.Clear();
-    for (std::int32_t i = 1; i <= count; ++i) {
-        auto channel = std::make_shared<QZIviFgenChannel>();
-        channel->Attach(m_oErr, PropSet());
-        channel->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-        items_.Append(std::move(channel));
-    }
-}
-
-void QZIviFgenChannels::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
-    const std::string p = BagPrefix(prefix, "Channels");
-    bag.WriteInt32(p + "ItemCount", Count(), 0);
-    std::int32_t i = 0;
-    for (const auto& channel : items_)
-        channel->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
-}
-
-void QZIviFgenChannels::Clone(QZIviFgenChannels& target) const {
-    for (const auto& channel : items_) {
-        target.Add(channel->Name());
-        if (const auto copy = target.Item(channel->Name())) channel->Clone(*copy);
-    }
-}
-
 } // namespace qzivi

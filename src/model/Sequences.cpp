@@ -383,47 +383,4 @@ std::int32_t QZIviFgenSequences::GetMinSequenceLength() {
     return Limit("GetMinSequenceLength", IVIFGEN_ATTR_MIN_SEQUENCE_LENGTH);
 }
 
-void QZIviFgenSequences::Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                                const std::shared_ptr<CIviFgenPropImp>& propSet) {
-    m_oErr = std::move(errorReport);
-    m_oPropSet = propSet;
-    for (const auto& sequence : items_)
-        sequence->Attach(m_oErr, propSet);
-}
-
-void QZIviFgenSequences::SetPath(const std::string& parentPath) {
-    m_sPath = JoinPath(parentPath, "Sequences");
-    for (const auto& sequence : items_)
-        sequence->SetPath(m_sPath);
-}
-
-void QZIviFgenSequences::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
-    const std::string p = BagPrefix(prefix, "Sequences");
-    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
-    if (count <= 0) return;
-    CheckItemCount(count, bag.Size(), p + "ItemCount");
-    items_.Clear();
-    for (std::int32_t i = 1; i <= count; ++i) {
-        auto sequence = std::make_shared<QZIviFgenSequence>();
-        sequence->Attach(m_oErr, PropSet());
-        sequence->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-        items_.Append(std::move(sequence));
-    }
-}
-
-void QZIviFgenSequences::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
-    const std::string p = BagPrefix(prefix, "Sequences");
-    bag.WriteInt32(p + "ItemCount", Count(), 0);
-    std::int32_t i = 0;
-    for (const auto& sequence : items_)
-        sequence->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
-}
-
-void QZIviFgenSequences::Clone(QZIviFgenSequences& target) const {
-    for (const auto& sequence : items_) {
-        target.Add(sequence->Name());
-        if (const auto copy = target.Item(sequence->Name())) sequence->Clone(*copy);
-    }
-}
-
 } // namespace qzivi

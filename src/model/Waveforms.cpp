@@ -340,47 +340,4 @@ std::int32_t QZIviFgenArbWaveforms::GetWaveformQuantum() {
     return Limit("GetWaveformQuantum", IVIFGEN_ATTR_WAVEFORM_QUANTUM);
 }
 
-void QZIviFgenArbWaveforms::Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                                   const std::shared_ptr<CIviFgenPropImp>& propSet) {
-    m_oErr = std::move(errorReport);
-    m_oPropSet = propSet;
-    for (const auto& waveform : items_)
-        waveform->Attach(m_oErr, propSet);
-}
-
-void QZIviFgenArbWaveforms::SetPath(const std::string& parentPath) {
-    m_sPath = JoinPath(parentPath, "Waveforms");
-    for (const auto& waveform : items_)
-        waveform->SetPath(m_sPath);
-}
-
-void QZIviFgenArbWaveforms::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
-    const std::string p = BagPrefix(prefix, "Waveforms");
-    const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
-    if (count <= 0) return;
-    CheckItemCount(count, bag.Size(), p + "ItemCount");
-    items_.Clear();
-    for (std::int32_t i = 1; i <= count; ++i) {
-        auto waveform = std::make_shared<QZIviFgenArbWaveform>();
-        waveform->Attach(m_oErr, PropSet());
-        waveform->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-        items_.Append(std::move(waveform));
-    }
-}
-
-void QZIviFgenArbWaveforms::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
-    const std::string p = BagPrefix(prefix, "Waveforms");
-    bag.WriteInt32(p + "ItemCount", Count(), 0);
-    std::int32_t i = 0;
-    for (const auto& waveform : items_)
-        waveform->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
-}
-
-void QZIviFgenArbWaveforms::Clone(QZIviFgenArbWaveforms& target) const {
-    for (const auto& waveform : items_) {
-        target.Add(waveform->Name());
-        if (const auto copy = target.Item(waveform->Name())) waveform->Clone(*copy);
-    }
-}
-
 } // namespace qzivi

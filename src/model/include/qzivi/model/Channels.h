@@ -148,13 +148,13 @@ private:
     Connection m_cCollectionChanged;
 };
 
-class QZIviFgenChannels : public std::enable_shared_from_this<QZIviFgenChannels> {
+class QZIviFgenChannels : public std::enable_shared_from_this<QZIviFgenChannels>,
+                          public ModelCollection<QZIviFgenChannel> {
 public:
-    // ---- Public ----
-    auto begin() const { return items_.begin(); }
-    auto end() const { return items_.end(); }
+    QZIviFgenChannels() : ModelCollection("Channels", "Channels") {}
+
+    // ---- Public; iterating it walks the channels in order ----
     std::shared_ptr<QZIviFgenChannel> Item(const Variant& Index);
-    std::int32_t Count() const { return items_.Count(); }
     std::shared_ptr<QZIviFgenChannel> Add(const std::string& ChannelName = "");
     void Remove(const Variant& Index);
     // With none active and channels present, the first becomes active, without an event.
@@ -162,33 +162,11 @@ public:
     void ActiveChannel(const std::shared_ptr<QZIviFgenChannel>& value);
 
     // ---- Internal ----
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                const std::shared_ptr<CIviFgenPropImp>& propSet);
-    const std::string& Path() const { return m_sPath; }
-    void SetPath(const std::string& parentPath);
-    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
-    void InitProperties() { items_.Clear(); }
-    void ReadProperties(const PropertyBag& bag, const std::string& prefix);
-    void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
-    void Clone(QZIviFgenChannels& target) const;
-    bool ContainsObject(const QZIviFgenChannel& object) const {
-        return items_.ContainsUniqueId(object.UniqueId());
-    }
-    std::int32_t IndexOfObject(const QZIviFgenChannel* object) const {
-        return items_.IndexOfObject(object);
-    }
-    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+    void Clone(QZIviFgenChannels& target) const { CloneInto(target); }
     std::string DefaultName() const { return items_.DefaultName("Channel"); }
-    const std::shared_ptr<QZIviFgenChannel>& At(std::int32_t position) const {
-        return items_.At(position);
-    }
 
 private:
-    ItemList<QZIviFgenChannel> items_;
     std::shared_ptr<QZIviFgenChannel> m_oActiveChannel;
-    std::shared_ptr<CIviErrorReport> m_oErr;
-    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
-    std::string m_sPath;
 };
 
 } // namespace qzivi

@@ -110,4 +110,88 @@ private:
     Items items_;
 };
 
+class CIviFgenPropImp;
+class PropertyBag;
+
+// The item count a bag claims, refused when no bag this program wrote could hold it.
+void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key);
+
+// What the three collections of the tree share: their items, attach, path, bag keys and clone.
+// `Item` is the class of their members.
+template <typename Item>
+class ModelCollection {
+public:
+    ModelCollection(const char* word, const char* part) : word_(word), part_(part) {}
+
+    typename ItemList<Item>::Items::const_iterator begin() const { return items_.begin(); }
+    typename ItemList<Item>::Items::const_iterator end() const { return items_.end(); }
+    std::int32_t Count() const { return items_.Count(); }
+    const std::shared_ptr<Item>& At(std::int32_t position) const { return items_.At(position); }
+
+    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
+                const std::shared_ptr<CIviFgenPropImp>& propSet) {
+        m_oErr = std::move(errorReport);
+        m_oPropSet = propSet;
+        for (const auto& item : items_)
+            item->Attach(m_oErr, propSet);
+    }
+    const std::string& Path() const { return m_sPath; }
+    void SetPath(const std::string& parentPath) {
+        m_sPath = JoinPath(parentPath, part_);
+        for (const auto& item : items_)
+            item->SetPath(m_sPath);
+    }
+    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
+    void InitProperties() { items_.Clear(); }
+
+    // A count above 0 replaces the items by that many, read in order, without events.
+    template <typename Bag>
+    void ReadProperties(const Bag& bag, const std::string& prefix) {
+        const std::string p = BagPrefix(prefix, word_);
+        const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
+        if (count <= 0) return;
+        CheckItemCount(count, bag.Size(), p + "ItemCount");
+        items_.Clear();
+        for (std::int32_t i = 1; i <= count; ++i) {
+            auto item = std::make_shared<Item>();
+            item->Attach(m_oErr, PropSet());
+            item->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
+            items_.Append(std::move(item));
+        }
+    }
+    template <typename Bag>
+    void WriteProperties(Bag& bag, const std::string& prefix) const {
+        const std::string p = BagPrefix(prefix, word_);
+        bag.WriteInt32(p + "ItemCount", Count(), 0);
+        std::int32_t i = 0;
+        for (const auto& item : items_)
+            item->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
+    }
+
+    bool ContainsObject(const Item& object) const {
+        return items_.ContainsUniqueId(object.UniqueId());
+    }
+    std::int32_t IndexOfObject(const Item* object) const { return items_.IndexOfObject(object); }
+    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+
+protected:
+    // For each item: Add by its name in `target`, then Clone into the first of that name there.
+    template <typename Collection>
+    void CloneInto(Collection& target) const {
+        for (const auto& item : items_) {
+            target.Add(item->Name());
+            if (const auto copy = target.Item(item->Name())) item->Clone(*copy);
+        }
+    }
+
+    ItemList<Item> items_;
+    std::shared_ptr<CIviErrorReport> m_oErr;
+    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
+    std::string m_sPath;
+
+private:
+    const char* word_;
+    const char* part_;
+};
+
 } // namespace qzivi

@@ -110,13 +110,13 @@ private:
 };
 
 class QZIviFgenSequences : public std::enable_shared_from_this<QZIviFgenSequences>,
+                           public ModelCollection<QZIviFgenSequence>,
                            public DeletedHandleQueue {
 public:
-    // ---- Public ----
-    auto begin() const { return items_.begin(); }
-    auto end() const { return items_.end(); }
+    QZIviFgenSequences() : ModelCollection("Sequences", "Sequences") {}
+
+    // ---- Public; iterating it walks the sequences in order ----
     std::shared_ptr<QZIviFgenSequence> Item(const Variant& Index);
-    std::int32_t Count() const { return items_.Count(); }
     std::shared_ptr<QZIviFgenSequence> Add(const std::string& SequenceName = "");
     void Remove(const Variant& Index);
     std::int32_t GetMaxLoopCount();
@@ -125,34 +125,11 @@ public:
     std::int32_t GetMinSequenceLength();
 
     // ---- Internal ----
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                const std::shared_ptr<CIviFgenPropImp>& propSet);
-    const std::string& Path() const { return m_sPath; }
-    void SetPath(const std::string& parentPath);
-    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
-    void InitProperties() { items_.Clear(); }
-    void ReadProperties(const PropertyBag& bag, const std::string& prefix);
-    void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
-    void Clone(QZIviFgenSequences& target) const;
-    bool ContainsObject(const QZIviFgenSequence& object) const {
-        return items_.ContainsUniqueId(object.UniqueId());
-    }
-    std::int32_t IndexOfObject(const QZIviFgenSequence* object) const {
-        return items_.IndexOfObject(object);
-    }
-    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+    void Clone(QZIviFgenSequences& target) const { CloneInto(target); }
     std::string DefaultName() const { return items_.DefaultName("Sequence"); }
-    const std::shared_ptr<QZIviFgenSequence>& At(std::int32_t position) const {
-        return items_.At(position);
-    }
 
 private:
     std::int32_t Limit(const char* operation, ViAttr attribute);
-
-    ItemList<QZIviFgenSequence> items_;
-    std::shared_ptr<CIviErrorReport> m_oErr;
-    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
-    std::string m_sPath;
 };
 
 } // namespace qzivi

@@ -111,13 +111,13 @@ private:
 };
 
 class QZIviFgenArbWaveforms : public std::enable_shared_from_this<QZIviFgenArbWaveforms>,
+                              public ModelCollection<QZIviFgenArbWaveform>,
                               public DeletedHandleQueue {
 public:
-    // ---- Public ----
-    auto begin() const { return items_.begin(); }
-    auto end() const { return items_.end(); }
+    QZIviFgenArbWaveforms() : ModelCollection("Waveforms", "Waveforms") {}
+
+    // ---- Public; iterating it walks the waveforms in order ----
     std::shared_ptr<QZIviFgenArbWaveform> Item(const Variant& Index);
-    std::int32_t Count() const { return items_.Count(); }
     std::shared_ptr<QZIviFgenArbWaveform>
     Add(const std::string& WaveformName = "", const Variant& Source = Variant::Missing(),
         const std::string& Filename = "", const Variant& AutoNormalizeMode = Variant::Missing());
@@ -128,42 +128,15 @@ public:
     std::int32_t GetWaveformQuantum();
 
     // ---- Internal ----
-    void Attach(std::shared_ptr<CIviErrorReport> errorReport,
-                const std::shared_ptr<CIviFgenPropImp>& propSet);
-    const std::string& Path() const { return m_sPath; }
-    void SetPath(const std::string& parentPath);
-    std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
-    void InitProperties() { items_.Clear(); }
-    void ReadProperties(const PropertyBag& bag, const std::string& prefix);
-    void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
-    void Clone(QZIviFgenArbWaveforms& target) const;
-    bool ContainsObject(const QZIviFgenArbWaveform& object) const {
-        return items_.ContainsUniqueId(object.UniqueId());
-    }
-    std::int32_t IndexOfObject(const QZIviFgenArbWaveform* object) const {
-        return items_.IndexOfObject(object);
-    }
-    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+    void Clone(QZIviFgenArbWaveforms& target) const { CloneInto(target); }
     std::string DefaultName() const { return items_.DefaultName("Waveform"); }
-    const std::shared_ptr<QZIviFgenArbWaveform>& At(std::int32_t position) const {
-        return items_.At(position);
-    }
 
 private:
     std::int32_t Limit(const char* operation, ViAttr attribute);
-
-    ItemList<QZIviFgenArbWaveform> items_;
-    std::shared_ptr<CIviErrorReport> m_oErr;
-    std::weak_ptr<CIviFgenPropImp> m_oPropSet;
-    std::string m_sPath;
 };
 
 // Reads a limit of the instrument under the state rules of the session: the mask 9, busy for the
 // call, the state given back on every way out. 0 when no session is open.
 std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source, ViAttr attribute);
-
-// The guard of the item counts a bag claims: more items than this in a bag of `entries` values
-// cannot be a bag this program wrote.
-void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key);
 
 } // namespace qzivi
