@@ -11,8 +11,7 @@ namespace {
 constexpr const char* kChannels = "QZIviFgenChannels";
 }
 
-// ---- QZIviFgenChannel
-// ----------------------------------------------------------------------------
+// ---- QZIviFgenChannel -----------------------------------------------------------------------
 
 void QZIviFgenChannel::Name(const std::string& value) {
     const std::string old = m_sName;
@@ -180,23 +179,15 @@ void QZIviFgenChannel::Clone(QZIviFgenChannel& target) const {
     target.UniqueId(m_sUniqueId);
 }
 
-// ---- QZIviFgenChannels
-// ---------------------------------------------------------------------------
+// ---- QZIviFgenChannels ----------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Item(const Variant& Index) {
-    return Guard(m_oErr, "Item", [&] {
-        auto found = items_.Lookup(Index);
-        if (!found) StdError(m_oErr, -31624, m_sPath + "Item");
-        return found;
-    });
+    return ItemOrRefuse(Index, -31624);
 }
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& ChannelName) {
     return Guard(m_oErr, "Add", [&] {
-        auto channel = std::make_shared<QZIviFgenChannel>();
-        channel->Attach(m_oErr, PropSet());
-        channel->InitProperties();
-        channel->Name(ChannelName.empty() ? DefaultName() : ChannelName);
+        auto channel = NewItem(ChannelName, "Channel");
         items_.Append(channel);
         if (const auto propSet = PropSet()) {
             ActiveChannel(channel);

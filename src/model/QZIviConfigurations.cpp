@@ -19,8 +19,7 @@ auto Always(const std::shared_ptr<CIviErrorReport>& err, const std::string& sour
 }
 } // namespace
 
-// ---- QZIviConfiguration
-// --------------------------------------------------------------------------
+// ---- QZIviConfiguration ---------------------------------------------------------------------
 
 void QZIviConfiguration::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                                 QZIviConfigurations* parent, const std::string& identifier) {
@@ -89,8 +88,7 @@ void QZIviConfiguration::Clone(QZIviConfiguration& target) const {
     target.Bag(m_aBag);
 }
 
-// ---- QZIviConfigurations
-// -------------------------------------------------------------------------
+// ---- QZIviConfigurations --------------------------------------------------------------------
 
 void QZIviConfigurations::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                                  CIviFgenPropImp* sourceSet, const std::string& identifier) {

@@ -23,8 +23,7 @@ void Ignoring(F&& step) {
 
 } // namespace
 
-// ---- QZIviFgenSequenceItem
-// -----------------------------------------------------------------------
+// ---- QZIviFgenSequenceItem ------------------------------------------------------------------
 
 void QZIviFgenSequenceItem::Waveform(const std::shared_ptr<QZIviFgenArbWaveform>& value) {
     Guard(m_oErr, "Waveform", [&] {
@@ -95,8 +94,7 @@ void QZIviFgenSequenceItem::Clone(QZIviFgenSequenceItem& target) const {
     target.Iterations(m_lIterations);
 }
 
-// ---- QZIviFgenSequence
-// ---------------------------------------------------------------------------
+// ---- QZIviFgenSequence ----------------------------------------------------------------------
 
 std::int32_t QZIviFgenSequence::IndexOfObject(const QZIviFgenSequenceItem* item) const {
     for (std::int32_t i = 1; i <= Count(); ++i)
@@ -325,23 +323,15 @@ void QZIviFgenSequence::Clone(QZIviFgenSequence& target) const {
     }
 }
 
-// ---- QZIviFgenSequences
-// --------------------------------------------------------------------------
+// ---- QZIviFgenSequences ---------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Item(const Variant& Index) {
-    return Guard(m_oErr, "Item", [&] {
-        auto found = items_.Lookup(Index);
-        if (!found) StdError(m_oErr, -31627, m_sPath + "Item");
-        return found;
-    });
+    return ItemOrRefuse(Index, -31627);
 }
 
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& SequenceName) {
     return Guard(m_oErr, "Add", [&] {
-        auto sequence = std::make_shared<QZIviFgenSequence>();
-        sequence->Attach(m_oErr, PropSet());
-        sequence->InitProperties();
-        sequence->Name(SequenceName.empty() ? DefaultName() : SequenceName);
+        auto sequence = NewItem(SequenceName, "Sequence");
         items_.Append(sequence);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),

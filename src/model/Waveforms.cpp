@@ -58,8 +58,7 @@ std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source
     return value;
 }
 
-// ---- QZIviFgenArbWaveform
-// ------------------------------------------------------------------------
+// ---- QZIviFgenArbWaveform -------------------------------------------------------------------
 
 void QZIviFgenArbWaveform::Name(const std::string& value) {
     const std::string old = m_sName;
@@ -264,11 +263,7 @@ void DeletedHandleQueue::RemoveDeletedHandleAt(std::int32_t i) {
 // ---- QZIviFgenArbWaveforms ---------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Item(const Variant& Index) {
-    return Guard(m_oErr, "Item", [&] {
-        auto found = items_.Lookup(Index);
-        if (!found) StdError(m_oErr, -31625, m_sPath + "Item");
-        return found;
-    });
+    return ItemOrRefuse(Index, -31625);
 }
 
 std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::string& WaveformName,
@@ -276,10 +271,7 @@ std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::stri
                                                                  const std::string& Filename,
                                                                  const Variant& AutoNormalizeMode) {
     return Guard(m_oErr, "Add", [&] {
-        auto waveform = std::make_shared<QZIviFgenArbWaveform>();
-        waveform->Attach(m_oErr, PropSet());
-        waveform->InitProperties();
-        waveform->Name(WaveformName.empty() ? DefaultName() : WaveformName);
+        auto waveform = NewItem(WaveformName, "Waveform");
         waveform->Source(Source.IsMissing() ? 0 : Source.AsInt32());
         waveform->Filename(Filename);
         if (!AutoNormalizeMode.IsMissing())

@@ -39,8 +39,7 @@ ITickSource& TickSource() {
     return Installed() != nullptr ? *Installed() : DefaultLoop();
 }
 
-// ---- CTimer
-// --------------------------------------------------------------------------------------
+// ---- CTimer ---------------------------------------------------------------------------------
 
 CTimer::~CTimer() {
     try {
@@ -92,8 +91,7 @@ void CTimer::RaiseTimer() {
     Timer();
 }
 
-// ---- MTimer
-// --------------------------------------------------------------------------------------
+// ---- MTimer ---------------------------------------------------------------------------------
 
 std::uint32_t MTimer::StartTimer(const std::shared_ptr<CTimer>& timer, std::uint32_t milliseconds) {
     const std::uint32_t id = TickSource().SetTimer(milliseconds);
@@ -129,8 +127,7 @@ std::size_t MTimer::RunningCount() {
     return Running().size();
 }
 
-// ---- TimerLoop
-// -----------------------------------------------------------------------------------
+// ---- TimerLoop ------------------------------------------------------------------------------
 
 std::uint32_t TimerLoop::SetTimer(std::uint32_t milliseconds) {
     const std::uint32_t id = nextId_++;

@@ -175,6 +175,23 @@ public:
     std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
 
 protected:
+    // Item of the collections: a miss is the failure `code` under Path + "Item".
+    std::shared_ptr<Item> ItemOrRefuse(const Variant& index, std::int32_t code) {
+        return Guard(m_oErr, "Item", [&] {
+            auto found = items_.Lookup(index);
+            if (!found) StdError(m_oErr, code, m_sPath + "Item");
+            return found;
+        });
+    }
+    // A new member, attached, with its defaults and named: `name`, or the next free default.
+    std::shared_ptr<Item> NewItem(const std::string& name, std::string_view base) {
+        auto item = std::make_shared<Item>();
+        item->Attach(m_oErr, PropSet());
+        item->InitProperties();
+        item->Name(name.empty() ? items_.DefaultName(base) : name);
+        return item;
+    }
+
     // For each item: Add by its name in `target`, then Clone into the first of that name there.
     template <typename Collection>
     void CloneInto(Collection& target) const {
