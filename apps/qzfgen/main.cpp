@@ -66,6 +66,10 @@ void Example(qzivi::QZIviFgen& fgen) {
 
 int main(int argc, char** argv) {
     Options options;
+    if (argc == 2 && (std::strcmp(argv[1], "--help") == 0 || std::strcmp(argv[1], "-h") == 0)) {
+        Usage(stdout);
+        return 0;
+    }
     if (!Parse(argc, argv, options)) {
         Usage(stderr);
         return 2;
