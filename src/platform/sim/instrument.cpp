@@ -745,27 +745,20 @@ void Instrument::Commit(const GlobalState& g, int channel, const ChannelState& s
 
 // ---- Configure functions -----------------------------------------------------------------------
 
-namespace {
-// The refusals a configure call meets: each attribute it sets, with its new value.
-struct Touch {
-    ViAttr attr;
-    double value;
-};
-} // namespace
-
-#define QZSIM_REFUSE(...)                                                                          \
-    for (const Touch& touch : std::initializer_list<Touch>{__VA_ARGS__})                           \
+void Instrument::CheckRefusals(std::initializer_list<Touch> touches) const {
+    for (const Touch& touch : touches)
         CheckRefused(touch.attr, touch.value);
+}
 
 void Instrument::ConfigureOutputMode(ViInt32 mode) {
-    QZSIM_REFUSE({IVIFGEN_ATTR_OUTPUT_MODE, double(mode)});
+    CheckRefusals({{IVIFGEN_ATTR_OUTPUT_MODE, double(mode)}});
     GlobalState g = global_;
     g.outputMode = mode;
     Commit(g, 0, channels_[0], false);
 }
 
 void Instrument::ConfigureRefClockSource(ViInt32 source) {
-    QZSIM_REFUSE({IVIFGEN_ATTR_REF_CLOCK_SOURCE, double(source)});
+    CheckRefusals({{IVIFGEN_ATTR_REF_CLOCK_SOURCE, double(source)}});
     GlobalState g = global_;
     g.refClockSource = source;
     Commit(g, 0, channels_[0], false);
@@ -773,7 +766,7 @@ void Instrument::ConfigureRefClockSource(ViInt32 source) {
 
 void Instrument::ConfigureOutputImpedance(const char* channel, double impedance) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_OUTPUT_IMPEDANCE, impedance});
+    CheckRefusals({{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, impedance}});
     ChannelState s = channels_[i];
     s.impedance = impedance;
     Commit(global_, i, s, false);
@@ -781,7 +774,7 @@ void Instrument::ConfigureOutputImpedance(const char* channel, double impedance)
 
 void Instrument::ConfigureOperationMode(const char* channel, ViInt32 mode) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_OPERATION_MODE, double(mode)});
+    CheckRefusals({{IVIFGEN_ATTR_OPERATION_MODE, double(mode)}});
     ChannelState s = channels_[i];
     s.operationMode = mode;
     Commit(global_, i, s, false);
@@ -789,7 +782,7 @@ void Instrument::ConfigureOperationMode(const char* channel, ViInt32 mode) {
 
 void Instrument::ConfigureOutputEnabled(const char* channel, bool enabled) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_OUTPUT_ENABLED, double(enabled)});
+    CheckRefusals({{IVIFGEN_ATTR_OUTPUT_ENABLED, double(enabled)}});
     ChannelState s = channels_[i];
     s.outputEnabled = enabled;
     Commit(global_, i, s, false);
@@ -797,11 +790,11 @@ void Instrument::ConfigureOutputEnabled(const char* channel, bool enabled) {
 
 void Instrument::ConfigureStandardWaveform(const char* channel, const FuncSettings& wanted) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_FUNC_WAVEFORM, double(wanted.waveform)},
-                 {IVIFGEN_ATTR_FUNC_AMPLITUDE, wanted.amplitude},
-                 {IVIFGEN_ATTR_FUNC_DC_OFFSET, wanted.offset},
-                 {IVIFGEN_ATTR_FUNC_FREQUENCY, wanted.frequency},
-                 {IVIFGEN_ATTR_FUNC_START_PHASE, wanted.startPhase});
+    CheckRefusals({{IVIFGEN_ATTR_FUNC_WAVEFORM, double(wanted.waveform)},
+                   {IVIFGEN_ATTR_FUNC_AMPLITUDE, wanted.amplitude},
+                   {IVIFGEN_ATTR_FUNC_DC_OFFSET, wanted.offset},
+                   {IVIFGEN_ATTR_FUNC_FREQUENCY, wanted.frequency},
+                   {IVIFGEN_ATTR_FUNC_START_PHASE, wanted.startPhase}});
     ChannelState s = channels_[i];
     const double duty = s.func.dutyCycleHigh;
     s.func = wanted;
@@ -883,8 +876,9 @@ void Instrument::ClearArbWaveform(ViInt32 handle) {
 void Instrument::ConfigureArbWaveform(const char* channel, ViInt32 handle, double gain,
                                       double offset) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, double(handle)}, {IVIFGEN_ATTR_ARB_GAIN, gain},
-                 {IVIFGEN_ATTR_ARB_OFFSET, offset});
+    CheckRefusals({{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, double(handle)},
+                   {IVIFGEN_ATTR_ARB_GAIN, gain},
+                   {IVIFGEN_ATTR_ARB_OFFSET, offset}});
     if (!waveforms_.contains(handle))
         Invalid("no waveform has the handle " + std::to_string(handle));
     ChannelState s = channels_[i];
@@ -970,8 +964,9 @@ void Instrument::ClearArbSequence(ViInt32 handle) {
 void Instrument::ConfigureArbSequence(const char* channel, ViInt32 handle, double gain,
                                       double offset) {
     const int i = ChannelIndex(channel);
-    QZSIM_REFUSE({IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, double(handle)}, {IVIFGEN_ATTR_ARB_GAIN, gain},
-                 {IVIFGEN_ATTR_ARB_OFFSET, offset});
+    CheckRefusals({{IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, double(handle)},
+                   {IVIFGEN_ATTR_ARB_GAIN, gain},
+                   {IVIFGEN_ATTR_ARB_OFFSET, offset}});
     if (!sequences_.contains(handle))
         Invalid("no sequence has the handle " + std::to_string(handle));
     ChannelState s = channels_[i];
@@ -1002,9 +997,9 @@ void Instrument::ConfigureAMSource(const char* channel, ViInt32 source) {
 }
 
 void Instrument::ConfigureAMInternal(double depth, ViInt32 waveform, double frequency) {
-    QZSIM_REFUSE({IVIFGEN_ATTR_AM_INTERNAL_DEPTH, depth},
-                 {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, double(waveform)},
-                 {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, frequency});
+    CheckRefusals({{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, depth},
+                   {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, double(waveform)},
+                   {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, frequency}});
     GlobalState g = global_;
     g.am = {depth, waveform, frequency};
     Commit(g, 0, channels_[0], false);
@@ -1019,15 +1014,13 @@ void Instrument::ConfigureFMSource(const char* channel, ViInt32 source) {
 }
 
 void Instrument::ConfigureFMInternal(double deviation, ViInt32 waveform, double frequency) {
-    QZSIM_REFUSE({IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, deviation},
-                 {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, double(waveform)},
-                 {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, frequency});
+    CheckRefusals({{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, deviation},
+                   {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, double(waveform)},
+                   {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, frequency}});
     GlobalState g = global_;
     g.fm = {deviation, waveform, frequency};
     Commit(g, 0, channels_[0], false);
 }
-
-#undef QZSIM_REFUSE
 
 // ---- Generation --------------------------------------------------------------------------------
 

@@ -4,6 +4,7 @@
 #include "faults.h"
 
 #include <chrono>
+#include <initializer_list>
 #include <map>
 #include <string>
 #include <variant>
@@ -148,6 +149,12 @@ private:
     void Validate(const GlobalState& global, const ChannelState& state) const;
     void CheckValue(ViAttr attr, double value, Range range, const char* unit) const;
     void CheckRefused(ViAttr attr, double value) const;
+    // The refusals a configure call meets: each attribute it sets, with its new value.
+    struct Touch {
+        ViAttr attr;
+        double value;
+    };
+    void CheckRefusals(std::initializer_list<Touch> touches) const;
     Range RangeOf(ViAttr attr, const GlobalState& global, const ChannelState& state) const;
     double ElapsedSeconds() const;
     double Sample(const ChannelState& state, double t, const std::vector<double>& triggers) const;
