@@ -187,7 +187,7 @@ std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Item(const Variant& Index) 
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& ChannelName) {
     return Guard(m_oErr, "Add", [&] {
-        auto channel = NewItem(ChannelName, "Channel");
+        auto channel = NewItem(ChannelName);
         items_.Append(channel);
         if (const auto propSet = PropSet()) {
             ActiveChannel(channel);

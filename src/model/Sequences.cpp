@@ -331,7 +331,7 @@ std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Item(const Variant& Index
 
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& SequenceName) {
     return Guard(m_oErr, "Add", [&] {
-        auto sequence = NewItem(SequenceName, "Sequence");
+        auto sequence = NewItem(SequenceName);
         items_.Append(sequence);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),

@@ -28,36 +28,6 @@ constexpr const char* kCollection = "QZIviFgenArbWaveforms";
 
 } // namespace
 
-void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key) {
-    // An item with every value at its default stores nothing, so a count may exceed the values,
-    // but not by this much.
-    constexpr std::size_t kSlack = 1000000;
-    if (count > 0 && static_cast<std::size_t>(count) > entries + kSlack)
-        RaiseRuntime(runtime::kImproperFile, "The property bag claims " + std::to_string(count) +
-                                                 " items under \"" + key + "\" but holds only " +
-                                                 std::to_string(entries) + " values.");
-}
-
-std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source,
-                                 ViAttr attribute) {
-    const std::int32_t saved = err.state();
-    std::int32_t value = 0;
-    try {
-        std::int32_t present = 0;
-        err.CheckForValidState(IviStateClosed | IviStateBusy, source, true, present);
-        if (saved > 0) {
-            const ViStatus status =
-                IviFgen_GetAttributeViInt32(err.hSession(), "", attribute, &value);
-            err.IviCheckError(status, source, 0, "");
-        }
-    } catch (...) {
-        err.state(saved);
-        ReRaise();
-    }
-    err.state(saved);
-    return value;
-}
-
 // ---- QZIviFgenArbWaveform -------------------------------------------------------------------
 
 void QZIviFgenArbWaveform::Name(const std::string& value) {
@@ -271,7 +241,7 @@ std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::stri
                                                                  const std::string& Filename,
                                                                  const Variant& AutoNormalizeMode) {
     return Guard(m_oErr, "Add", [&] {
-        auto waveform = NewItem(WaveformName, "Waveform");
+        auto waveform = NewItem(WaveformName);
         waveform->Source(Source.IsMissing() ? 0 : Source.AsInt32());
         waveform->Filename(Filename);
         if (!AutoNormalizeMode.IsMissing())

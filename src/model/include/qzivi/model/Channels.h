@@ -151,7 +151,7 @@ private:
 class QZIviFgenChannels : public std::enable_shared_from_this<QZIviFgenChannels>,
                           public ModelCollection<QZIviFgenChannel> {
 public:
-    QZIviFgenChannels() : ModelCollection("Channels", "Channels") {}
+    QZIviFgenChannels() : ModelCollection("Channels", "Channel") {}
 
     // ---- Public; iterating it walks the channels in order ----
     std::shared_ptr<QZIviFgenChannel> Item(const Variant& Index);
@@ -163,7 +163,6 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenChannels& target) const { CloneInto(target); }
-    std::string DefaultName() const { return items_.DefaultName("Channel"); }
 
 private:
     std::shared_ptr<QZIviFgenChannel> m_oActiveChannel;

@@ -116,12 +116,18 @@ class PropertyBag;
 // The item count a bag claims, refused when no bag this program wrote could hold it.
 void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key);
 
+// Reads a limit of the instrument under the state rules of the session: the mask 9, busy for the
+// call, the state given back on every way out. 0 when no session is open.
+std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source, ViAttr attribute);
+
 // What the three collections of the tree share: their items, attach, path, bag keys and clone.
 // `Item` is the class of their members.
 template <typename Item>
 class ModelCollection {
 public:
-    ModelCollection(const char* word, const char* part) : word_(word), part_(part) {}
+    // `word` names the collection in bag keys and paths ("Channels"), `itemWord` its members'
+    // default names ("Channel").
+    ModelCollection(const char* word, const char* itemWord) : word_(word), itemWord_(itemWord) {}
 
     typename ItemList<Item>::Items::const_iterator begin() const { return items_.begin(); }
     typename ItemList<Item>::Items::const_iterator end() const { return items_.end(); }
@@ -137,7 +143,7 @@ public:
     }
     const std::string& Path() const { return m_sPath; }
     void SetPath(const std::string& parentPath) {
-        m_sPath = JoinPath(parentPath, part_);
+        m_sPath = JoinPath(parentPath, word_);
         for (const auto& item : items_)
             item->SetPath(m_sPath);
     }
@@ -173,6 +179,7 @@ public:
     }
     std::int32_t IndexOfObject(const Item* object) const { return items_.IndexOfObject(object); }
     std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
+    std::string DefaultName() const { return items_.DefaultName(itemWord_); }
 
 protected:
     // Item of the collections: a miss is the failure `code` under Path + "Item".
@@ -184,11 +191,11 @@ protected:
         });
     }
     // A new member, attached, with its defaults and named: `name`, or the next free default.
-    std::shared_ptr<Item> NewItem(const std::string& name, std::string_view base) {
+    std::shared_ptr<Item> NewItem(const std::string& name) {
         auto item = std::make_shared<Item>();
         item->Attach(m_oErr, PropSet());
         item->InitProperties();
-        item->Name(name.empty() ? items_.DefaultName(base) : name);
+        item->Name(name.empty() ? DefaultName() : name);
         return item;
     }
 
@@ -208,7 +215,7 @@ protected:
 
 private:
     const char* word_;
-    const char* part_;
+    const char* itemWord_;
 };
 
 } // namespace qzivi

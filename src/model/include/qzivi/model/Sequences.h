@@ -113,7 +113,7 @@ class QZIviFgenSequences : public std::enable_shared_from_this<QZIviFgenSequence
                            public ModelCollection<QZIviFgenSequence>,
                            public DeletedHandleQueue {
 public:
-    QZIviFgenSequences() : ModelCollection("Sequences", "Sequences") {}
+    QZIviFgenSequences() : ModelCollection("Sequences", "Sequence") {}
 
     // ---- Public; iterating it walks the sequences in order ----
     std::shared_ptr<QZIviFgenSequence> Item(const Variant& Index);
@@ -126,7 +126,6 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenSequences& target) const { CloneInto(target); }
-    std::string DefaultName() const { return items_.DefaultName("Sequence"); }
 
 private:
     std::int32_t Limit(const char* operation, ViAttr attribute);

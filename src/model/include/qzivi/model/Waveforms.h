@@ -114,7 +114,7 @@ class QZIviFgenArbWaveforms : public std::enable_shared_from_this<QZIviFgenArbWa
                               public ModelCollection<QZIviFgenArbWaveform>,
                               public DeletedHandleQueue {
 public:
-    QZIviFgenArbWaveforms() : ModelCollection("Waveforms", "Waveforms") {}
+    QZIviFgenArbWaveforms() : ModelCollection("Waveforms", "Waveform") {}
 
     // ---- Public; iterating it walks the waveforms in order ----
     std::shared_ptr<QZIviFgenArbWaveform> Item(const Variant& Index);
@@ -129,14 +129,9 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenArbWaveforms& target) const { CloneInto(target); }
-    std::string DefaultName() const { return items_.DefaultName("Waveform"); }
 
 private:
     std::int32_t Limit(const char* operation, ViAttr attribute);
 };
-
-// Reads a limit of the instrument under the state rules of the session: the mask 9, busy for the
-// call, the state given back on every way out. 0 when no session is open.
-std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source, ViAttr attribute);
 
 } // namespace qzivi
