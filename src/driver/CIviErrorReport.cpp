@@ -1,4 +1,5 @@
 #include "qzivi/driver/CIviErrorReport.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/driver/StringTable.h"
@@ -62,24 +63,25 @@ void CIviErrorReport::state(std::int32_t newState) {
     state_ = newState;
 }
 
-void CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source,
-                                         bool setBusy, std::int32_t& result) {
+std::int32_t CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source,
+                                                 bool setBusy) {
     if ((forbidden & state_) != 0) {
-        if (state_ & IviStateClosed) DoStdError(-31600, source);
-        if (state_ & IviStateInitialized) DoStdError(-31601, source);
-        DoStdError(-31602, source);
+        if (state_ & IviStateClosed) DoStdError(errid::kNotInitialized, source);
+        if (state_ & IviStateInitialized) DoStdError(errid::kNotConfigured, source);
+        DoStdError(errid::kOperationInProgress, source);
     }
-    result = state_;
+    const std::int32_t present = state_;
     if (setBusy) state(IviStateBusy);
+    return present;
 }
 
-void CIviErrorReport::CheckForValidState(std::int32_t forbidden, std::string_view path,
-                                         std::string_view word, bool setBusy,
-                                         std::int32_t& result) {
+std::int32_t CIviErrorReport::CheckForValidState(std::int32_t forbidden, std::string_view path,
+                                                 std::string_view word, bool setBusy) {
     if ((forbidden & state_) != 0)
-        CheckForValidState(forbidden, std::string(path).append(word), setBusy, result);
-    result = state_;
+        return CheckForValidState(forbidden, std::string(path).append(word), setBusy);
+    const std::int32_t present = state_;
     if (setBusy) state(IviStateBusy);
+    return present;
 }
 
 ViSession CIviErrorReport::hSession() const {
@@ -116,10 +118,9 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
             if (reInitBehavior == qziviCloseAndInit)
                 CloseSession(true);
             else
-                DoStdError(-31612, "Init");
+                DoStdError(errid::kAlreadyInitialized, "Init");
         }
-        std::int32_t present = 0;
-        CheckForValidState(IviStateBusy, "Init", true, present);
+        CheckForValidState(IviStateBusy, "Init", true);
         if (UsingSessionMgr()) {
             InSessionMgrCall = true;
             IviSession_ = SessionMgr_->GetSession("IVI::IVIFGEN::" + name, 0);
@@ -137,7 +138,7 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
             state(IviStateInitialized);
             lastLogicalName_ = name;
         }
-        if (!IsSpecVersionOk()) DoStdError(-31610, "Init");
+        if (!IsSpecVersionOk()) DoStdError(errid::kClassSpecVersion, "Init");
         Initialized();
     } catch (...) {
         const PendingFailure failure = CurrentFailure();
@@ -157,8 +158,7 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
 
 void CIviErrorReport::CloseSession(bool raiseAgain) {
     try {
-        std::int32_t present = 0;
-        CheckForValidState(IviStateClosed | IviStateBusy, "CloseSession", true, present);
+        CheckForValidState(IviStateClosed | IviStateBusy, "CloseSession", true);
         if (UsingSessionMgr()) {
             IviSession_.reset();
         } else {

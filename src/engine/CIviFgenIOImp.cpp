@@ -1,4 +1,5 @@
 #include "qzivi/engine/CIviFgenIOImp.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/driver/CIviErrorReport.h"
 #include "qzivi/driver/ErrorModule.h"
@@ -85,26 +86,29 @@ void CIviFgenIOImp::Configure(bool internalCall) {
         const bool enabled = prop.Enabled();
         const std::int32_t ext = prop.Extensions();
         const std::int32_t channels = prop.Channels()->Count();
-        if (channels == 0 || !Has(ext, 8 | 1 | 2) || !enabled) {
+        if (channels == 0 ||
+            !Has(ext, qzivifgenArbSeqExt | qzivifgenStdFuncExt | qzivifgenArbWfmExt) || !enabled) {
             if (!enabled) return;
-            m_oErr->DoStdError(channels > 0 ? -31621 : -31620, Path() + "Configure");
+            m_oErr->DoStdError(channels > 0 ? errid::kNoOutputModeExtension : errid::kNoChannels,
+                               Path() + "Configure");
         }
-        if (prop.OutputMode() == 2 && !m_bSeqPrepassDone && prop.Waveforms()->Count() > 0) {
+        if (prop.OutputMode() == qzivifgenOutputSeq && !m_bSeqPrepassDone &&
+            prop.Waveforms()->Count() > 0) {
             m_bSeqPrepassDone = true;
-            prop.OutputMode(1);
+            prop.OutputMode(qzivifgenOutputArb);
             try {
                 Configure(true);
             } catch (...) {
-                prop.OutputMode(2); // a failed pre-pass leaves the user's mode as it was
+                prop.OutputMode(
+                    qzivifgenOutputSeq); // a failed pre-pass leaves the user's mode as it was
                 throw;
             }
-            prop.OutputMode(2);
+            prop.OutputMode(qzivifgenOutputSeq);
         }
         Init(false, false, "", qziviNoOp);
-        std::int32_t saved = 0;
         if (m_oErr->state() == IviStateBusy)
             runOwnsState = false; // refused below; the state is another's
-        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path(), "Configure", true, saved);
+        m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path(), "Configure", true);
         Run(internalCall);
     } catch (...) {
         if (runOwnsState && m_oErr->state() > IviStateClosed) m_oErr->state(IviStateInitialized);
@@ -137,7 +141,7 @@ void CIviFgenIOImp::Run(bool internalCall) {
     const std::int32_t mode = prop.OutputMode();
     Checked(IviFgen_ConfigureOutputMode(vi, mode), "Base", "",
             {{IVIFGEN_ATTR_OUTPUT_MODE, AttrType::Int32, mode, Path(), "OutputMode"}});
-    if (mode != 0 && !m_bArbMemoryCleared) {
+    if (mode != qzivifgenOutputFunc && !m_bArbMemoryCleared) {
         IviFgen_ClearArbWaveform(vi, IVIFGEN_VAL_ALL_WAVEFORMS);
         m_bArbMemoryCleared = true;
     }
@@ -146,7 +150,8 @@ void CIviFgenIOImp::Run(bool internalCall) {
     Checked(IviFgen_ConfigureRefClockSource(vi, prop.RefClockSource()), "Base", "",
             {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, AttrType::Int32, prop.RefClockSource(), Path(),
               "RefClockSource"}});
-    if (Has(ext, 2) && !Has(ext, 4) && mode != 0)
+    if (Has(ext, qzivifgenArbWfmExt) && !Has(ext, qzivifgenArbFrequencyExt) &&
+        mode != qzivifgenOutputFunc)
         Checked(IviFgen_ConfigureSampleRate(vi, prop.ArbSampleRate()), "Base", "",
                 {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, AttrType::Real64, prop.ArbSampleRate(), Path(),
                   "ArbSampleRate"}});
@@ -156,7 +161,7 @@ void CIviFgenIOImp::Run(bool internalCall) {
         ConfigureChannel(*channel, anyTrigger, anyAM, anyFM);
 
     const auto& in = *prop.Internal();
-    if (Has(ext, 256) && anyAM)
+    if (Has(ext, qzivifgenModulateAMExt) && anyAM)
         Checked(IviFgen_ConfigureAMInternal(vi, in.AMInternalDepth(), in.AMInternalWaveform(),
                                             in.AMInternalFrequency()),
                 "ModulateAM", "",
@@ -166,7 +171,7 @@ void CIviFgenIOImp::Run(bool internalCall) {
                   in.Path(), "AMInternalWaveform"},
                  {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, AttrType::Real64, in.AMInternalFrequency(),
                   in.Path(), "AMInternalFrequency"}});
-    if (Has(ext, 512) && anyFM)
+    if (Has(ext, qzivifgenModulateFMExt) && anyFM)
         Checked(IviFgen_ConfigureFMInternal(vi, in.FMInternalDeviation(), in.FMInternalWaveform(),
                                             in.FMInternalFrequency()),
                 "ModulateFM", "",
@@ -176,7 +181,7 @@ void CIviFgenIOImp::Run(bool internalCall) {
                   in.Path(), "FMInternalWaveform"},
                  {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, AttrType::Real64, in.FMInternalFrequency(),
                   in.Path(), "FMInternalFrequency"}});
-    if (Has(ext, 32) && anyTrigger)
+    if (Has(ext, qzivifgenInternalTriggerExt) && anyTrigger)
         Checked(IviFgen_ConfigureInternalTriggerRate(vi, in.InternalTriggerRate()),
                 "InternalTrigger", "",
                 {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, AttrType::Real64, in.InternalTriggerRate(),
@@ -206,27 +211,29 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
 
     const ViStatus impedance =
         IviFgen_ConfigureOutputImpedance(vi, name.c_str(), ch.OutputImpedance());
-    if (impedance == IVI_ERROR_UNKNOWN_CHANNEL_NAME) m_oErr->DoStdError(-31617, name, 0, "");
+    if (impedance == IVI_ERROR_UNKNOWN_CHANNEL_NAME)
+        m_oErr->DoStdError(errid::kInvalidChannelName, name, 0, "");
     Checked(impedance, "Base", name,
             {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, AttrType::Real64, ch.OutputImpedance(), path,
               "OutputImpedance"}});
     Checked(IviFgen_ConfigureOperationMode(vi, name.c_str(), ch.OperationMode()), "Base", name,
             {{IVIFGEN_ATTR_OPERATION_MODE, AttrType::Int32, ch.OperationMode(), path,
               "OperationMode"}});
-    if (Has(ext, 128) && ch.OperationMode() == 1)
+    if (Has(ext, qzivifgenBurstExt) && ch.OperationMode() == qzivifgenOperateBurst)
         Checked(IviFgen_ConfigureBurstCount(vi, name.c_str(), ch.BurstCount()), "Burst", name,
                 {{IVIFGEN_ATTR_BURST_COUNT, AttrType::Int32, ch.BurstCount(), path, "BurstCount"}});
-    if (Has(ext, 16)) {
+    if (Has(ext, qzivifgenTriggerExt)) {
         Checked(IviFgen_ConfigureTriggerSource(vi, name.c_str(), ch.TriggerSource()), "Trigger",
                 name,
                 {{IVIFGEN_ATTR_TRIGGER_SOURCE, AttrType::Int32, ch.TriggerSource(), path,
                   "TriggerSource"}});
-        if (ch.TriggerSource() == 3) anyTrigger = true;
+        if (ch.TriggerSource() == qzivifgenInternalTrigger) anyTrigger = true;
     }
 
     switch (prop.OutputMode()) {
-    case 0:
-        if (!Has(ext, 1)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
+    case qzivifgenOutputFunc:
+        if (!Has(ext, qzivifgenStdFuncExt))
+            m_oErr->DoStdError(errid::kOutputModeExtensionOff, path + "OutputMode", 0, "");
         Checked(
             IviFgen_ConfigureStandardWaveform(vi, name.c_str(), ch.FuncWaveform(),
                                               ch.FuncAmplitude(), ch.FuncDCOffset(),
@@ -242,11 +249,12 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
              {IVIFGEN_ATTR_FUNC_START_PHASE, AttrType::Real64, ch.FuncStartPhase(), path,
               "FuncStartPhase"}});
         break;
-    case 1: {
-        if (!Has(ext, 2)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
+    case qzivifgenOutputArb: {
+        if (!Has(ext, qzivifgenArbWfmExt))
+            m_oErr->DoStdError(errid::kOutputModeExtensionOff, path + "OutputMode", 0, "");
         if (!ch.ArbWaveform()) {
             if (prop.Waveforms()->Count() == 0)
-                m_oErr->DoStdError(-31622, Path() + "Configure", 0, "");
+                m_oErr->DoStdError(errid::kNoWaveform, Path() + "Configure", 0, "");
             ch.ArbWaveform(prop.Waveforms()->At(1));
         }
         const std::int32_t handle = ch.ArbWaveform() ? ch.ArbWaveform()->WaveformHandle() : 0;
@@ -256,18 +264,19 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
             {{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, AttrType::Int32, handle, path, "ArbWaveform"},
              {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
              {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
-        if (Has(ext, 4))
+        if (Has(ext, qzivifgenArbFrequencyExt))
             Checked(IviFgen_ConfigureArbFrequency(vi, name.c_str(), ch.ArbFrequency()),
                     "ArbFrequency", name,
                     {{IVIFGEN_ATTR_ARB_FREQUENCY, AttrType::Real64, ch.ArbFrequency(), path,
                       "ArbFrequency"}});
         break;
     }
-    case 2: {
-        if (!Has(ext, 8)) m_oErr->DoStdError(-31628, path + "OutputMode", 0, "");
+    case qzivifgenOutputSeq: {
+        if (!Has(ext, qzivifgenArbSeqExt))
+            m_oErr->DoStdError(errid::kOutputModeExtensionOff, path + "OutputMode", 0, "");
         if (!ch.Sequence()) {
             if (prop.Sequences()->Count() == 0)
-                m_oErr->DoStdError(-31616, Path() + "Configure", 0, "");
+                m_oErr->DoStdError(errid::kInvalidSequence, Path() + "Configure", 0, "");
             ch.Sequence(prop.Sequences()->At(1));
         }
         const std::int32_t handle = ch.Sequence() ? ch.Sequence()->SequenceHandle() : 0;
@@ -283,7 +292,7 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         break;
     }
 
-    if (Has(ext, 256)) {
+    if (Has(ext, qzivifgenModulateAMExt)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.AMEnabled());
         Checked(IviFgen_ConfigureAMEnabled(vi, name.c_str(), on), "ModulateAM", name,
                 {{IVIFGEN_ATTR_AM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
@@ -291,10 +300,10 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         if (ch.AMEnabled()) {
             Checked(IviFgen_ConfigureAMSource(vi, name.c_str(), ch.AMSource()), "ModulateAM", name,
                     {{IVIFGEN_ATTR_AM_SOURCE, AttrType::Int32, ch.AMSource(), path, "AMSource"}});
-            if (ch.AMSource() == 0) anyAM = true;
+            if (ch.AMSource() == qzivifgenAMInternal) anyAM = true;
         }
     }
-    if (Has(ext, 512)) {
+    if (Has(ext, qzivifgenModulateFMExt)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.FMEnabled());
         Checked(IviFgen_ConfigureFMEnabled(vi, name.c_str(), on), "ModulateFM", name,
                 {{IVIFGEN_ATTR_FM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
@@ -302,7 +311,7 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         if (ch.FMEnabled()) {
             Checked(IviFgen_ConfigureFMSource(vi, name.c_str(), ch.FMSource()), "ModulateFM", name,
                     {{IVIFGEN_ATTR_FM_SOURCE, AttrType::Int32, ch.FMSource(), path, "FMSource"}});
-            if (ch.FMSource() == 0) anyFM = true;
+            if (ch.FMSource() == qzivifgenFMInternal) anyFM = true;
         }
     }
 }
@@ -315,7 +324,7 @@ void CIviFgenIOImp::Checked(ViStatus status, const char* word, const std::string
     if (status == 0) return;
     for (const auto& p : params)
         if (!CheckNumber(p.type, p.id, p.value, channel.c_str()))
-            m_oErr->DoStdError(-30002, p.owner + p.name, status, channel);
+            m_oErr->DoStdError(errid::kInvalidArgument, p.owner + p.name, status, channel);
     // Every value would be taken: the driver's own status stands. An error raises; a warning
     // fires and the run goes on.
     m_oErr->IviCheckError(status, "", 0, "");
@@ -328,11 +337,16 @@ void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, std::string_view ca
         std::int32_t flag;
         std::string_view group; // "IviFgen" and the word
     };
-    static constexpr Word kWords[] = {
-        {4, "IviFgenArbFrequency"}, {8, "IviFgenArbSeq"},           {2, "IviFgenArbWfm"},
-        {128, "IviFgenBurst"},      {32, "IviFgenInternalTrigger"}, {256, "IviFgenModulateAM"},
-        {512, "IviFgenModulateFM"}, {64, "IviFgenSoftwareTrigger"}, {1, "IviFgenStdFunc"},
-        {16, "IviFgenTrigger"}};
+    static constexpr Word kWords[] = {{qzivifgenArbFrequencyExt, "IviFgenArbFrequency"},
+                                      {qzivifgenArbSeqExt, "IviFgenArbSeq"},
+                                      {qzivifgenArbWfmExt, "IviFgenArbWfm"},
+                                      {qzivifgenBurstExt, "IviFgenBurst"},
+                                      {qzivifgenInternalTriggerExt, "IviFgenInternalTrigger"},
+                                      {qzivifgenModulateAMExt, "IviFgenModulateAM"},
+                                      {qzivifgenModulateFMExt, "IviFgenModulateFM"},
+                                      {qzivifgenSoftwareTriggerExt, "IviFgenSoftwareTrigger"},
+                                      {qzivifgenStdFuncExt, "IviFgenStdFunc"},
+                                      {qzivifgenTriggerExt, "IviFgenTrigger"}};
     std::string missing;
     for (const auto& [flag, group] : kWords)
         if (Has(extensions, flag) && capabilities.find(group) == std::string_view::npos)
@@ -342,7 +356,7 @@ void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, std::string_view ca
         m_sCheckedCapabilities = capabilities;
         return;
     }
-    throw Failure(30717, missing,
+    throw Failure(errid::kExtensionNotSupported, missing,
                   "Extension capability not supported by instrument driver.  (" + missing + ")");
 }
 
@@ -366,23 +380,25 @@ void CIviFgenIOImp::CreateMissingHandles() {
     auto& prop = *m_oProp;
     const std::int32_t ext = prop.Extensions();
     const ViSession vi = Vi();
-    if (Has(ext, 2) && prop.OutputMode() == 1)
+    if (Has(ext, qzivifgenArbWfmExt) && prop.OutputMode() == qzivifgenOutputArb)
         for (const auto& waveform : *prop.Waveforms()) {
             if (waveform->WaveformHandle() != 0) continue;
             const Points data = waveform->Data();
-            if (!data) m_oErr->DoStdError(-31613, waveform->Name(), 0, "");
+            if (!data) m_oErr->DoStdError(errid::kInvalidWaveform, waveform->Name(), 0, "");
             ViInt32 handle = 0;
             const ViStatus status = IviFgen_CreateArbWaveform(
                 vi, static_cast<ViInt32>(data->size()), data->data(), &handle);
             m_oErr->IviCheckError(status, waveform->Name(), 0, waveform->Name());
             waveform->SetWaveformHandle(handle);
         }
-    if (Has(ext, 8) && prop.OutputMode() == 2)
+    if (Has(ext, qzivifgenArbSeqExt) && prop.OutputMode() == qzivifgenOutputSeq)
         for (const auto& sequence : *prop.Sequences()) {
             if (sequence->SequenceHandle() != 0) continue;
-            if (sequence->Count() == 0) m_oErr->DoStdError(-31616, sequence->Name(), 0, "");
+            if (sequence->Count() == 0)
+                m_oErr->DoStdError(errid::kInvalidSequence, sequence->Name(), 0, "");
             for (const auto& item : *sequence)
-                if (!item->Waveform()) m_oErr->DoStdError(-31616, sequence->Name(), 0, "");
+                if (!item->Waveform())
+                    m_oErr->DoStdError(errid::kInvalidSequence, sequence->Name(), 0, "");
             const auto handles = sequence->WaveformHandles();
             const auto counts = sequence->IterationCounts();
             ViInt32 handle = 0;
@@ -408,8 +424,7 @@ void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char*
     if (!m_oProp->Enabled()) return;
     const std::int32_t saved = m_oErr->state();
     try {
-        std::int32_t present = 0;
-        if (!internalCall) m_oErr->CheckForValidState(mask, Path(), word, true, present);
+        if (!internalCall) m_oErr->CheckForValidState(mask, Path(), word, true);
         const ViStatus status = call(Vi());
         m_oErr->IviCheckError(status, status == 0 ? std::string() : Path() + word, 0, "");
         m_oErr->state(saved);
@@ -420,7 +435,7 @@ void CIviFgenIOImp::Generation(bool internalCall, std::int32_t mask, const char*
 }
 
 void CIviFgenIOImp::Initiate(bool internalCall) {
-    Generation(internalCall, -5, "Initiate", &IviFgen_InitiateGeneration);
+    Generation(internalCall, ~IviStateConfigured, "Initiate", &IviFgen_InitiateGeneration);
 }
 
 void CIviFgenIOImp::Abort(bool internalCall) {
@@ -428,7 +443,7 @@ void CIviFgenIOImp::Abort(bool internalCall) {
 }
 
 void CIviFgenIOImp::SendSoftwareTrigger() {
-    Generation(false, -5, "SendSoftwareTrigger", &IviFgen_SendSoftwareTrigger);
+    Generation(false, ~IviStateConfigured, "SendSoftwareTrigger", &IviFgen_SendSoftwareTrigger);
 }
 
 // ---- Capability queries -------------------------------------------------------------------------
@@ -546,18 +561,18 @@ std::vector<Variant> CIviFgenIOImp::IVIFgenGetValidFunctions(bool keepStandard) 
     if (!keepStandard)
         for (std::int32_t v = 1; v <= 6; ++v) {
             const bool available =
-                Has(ext, 1) &&
+                Has(ext, qzivifgenStdFuncExt) &&
                 (CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "") ||
                  CheckAttributeVi(AttrType::Int32, IVIFGEN_ATTR_FUNC_WAVEFORM, v, "1"));
             m_aValidFunctions[static_cast<std::size_t>(v - 1)] = available ? 1 : 0;
         }
     ViInt32 a = 0, b = 0, c = 0, d = 0;
-    m_aValidFunctions[6] = Has(ext, 2) &&
+    m_aValidFunctions[6] = Has(ext, qzivifgenArbWfmExt) &&
                                    IviFgen_QueryArbWfmCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
                                    m_oProp->Waveforms()->Count() > 0
                                ? 1
                                : 0;
-    m_aValidFunctions[7] = Has(ext, 8) &&
+    m_aValidFunctions[7] = Has(ext, qzivifgenArbSeqExt) &&
                                    IviFgen_QueryArbSeqCapabilities(Vi(), &a, &b, &c, &d) == 0 &&
                                    m_oProp->Sequences()->Count() > 0
                                ? 1

@@ -1,4 +1,5 @@
 #include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/driver/CIviErrorReport.h"
 #include "qzivi/model/Conventions.h"
@@ -59,8 +60,8 @@ void CIviFgenPropImp::Enabled(bool value) {
 
 void CIviFgenPropImp::UIStyle(std::int32_t value) {
     if (value < 0 || value > 2) {
-        if (m_oErr) m_oErr->DoStdError(-30002, m_sPath + "UIStyle");
-        throw Failure(-30002, m_sPath + "UIStyle",
+        if (m_oErr) m_oErr->DoStdError(errid::kInvalidArgument, m_sPath + "UIStyle");
+        throw Failure(errid::kInvalidArgument, m_sPath + "UIStyle",
                       "An invalid argument has been passed to a property or method. (" + m_sPath +
                           "UIStyle)");
     }

@@ -1,4 +1,5 @@
 #include "qzivi/model/Channels.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/model/PropertyBag.h"
@@ -28,7 +29,7 @@ void QZIviFgenChannel::ArbWaveform(const std::shared_ptr<QZIviFgenArbWaveform>& 
             if (!propSet)
                 RaiseRuntime(91, "Object variable not set: the channel belongs to no control.");
             if (!propSet->Waveforms()->ContainsObject(*value))
-                StdError(m_oErr, -31618, m_sPath + "ArbWaveform");
+                StdError(m_oErr, errid::kForeignObject, m_sPath + "ArbWaveform");
         }
         m_oArbWaveform = value;
     });
@@ -42,7 +43,7 @@ void QZIviFgenChannel::Sequence(const std::shared_ptr<QZIviFgenSequence>& value)
             if (!propSet)
                 RaiseRuntime(91, "Object variable not set: the channel belongs to no control.");
             if (!propSet->Sequences()->ContainsObject(*value))
-                StdError(m_oErr, -31618, m_sPath + "Sequence");
+                StdError(m_oErr, errid::kForeignObject, m_sPath + "Sequence");
         }
     });
 }
@@ -182,7 +183,7 @@ void QZIviFgenChannel::Clone(QZIviFgenChannel& target) const {
 // ---- QZIviFgenChannels ----------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Item(const Variant& Index) {
-    return ItemOrRefuse(Index, -31624);
+    return ItemOrRefuse(Index, errid::kNoSuchChannel);
 }
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& ChannelName) {
@@ -201,7 +202,7 @@ std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& Chan
 void QZIviFgenChannels::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
         const std::int32_t position = items_.RemovalPosition(Index);
-        if (position == 0) StdError(m_oErr, -31611, m_sPath + "Remove");
+        if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         const auto active = ActiveChannel();
         if (active && (IndexOfObject(active.get()) == position ||
                        std::to_string(position) == active->Name())) {
@@ -231,7 +232,7 @@ void QZIviFgenChannels::ActiveChannel(const std::shared_ptr<QZIviFgenChannel>& v
             if (!propSet)
                 RaiseRuntime(91, "Object variable not set: the channels belong to no control.");
             if (!propSet->Channels()->ContainsObject(*value))
-                StdError(m_oErr, -31618, m_sPath + "ActiveChannel");
+                StdError(m_oErr, errid::kForeignObject, m_sPath + "ActiveChannel");
         }
         m_oActiveChannel = value;
         if (propSet)

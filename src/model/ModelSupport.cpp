@@ -17,8 +17,7 @@ std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source
     const std::int32_t saved = err.state();
     std::int32_t value = 0;
     try {
-        std::int32_t present = 0;
-        err.CheckForValidState(IviStateClosed | IviStateBusy, source, true, present);
+        err.CheckForValidState(IviStateClosed | IviStateBusy, source, true);
         if (saved > 0) {
             const ViStatus status =
                 IviFgen_GetAttributeViInt32(err.hSession(), "", attribute, &value);

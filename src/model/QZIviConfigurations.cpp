@@ -1,4 +1,5 @@
 #include "qzivi/model/QZIviConfigurations.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/model/CPropBagFile.h"
@@ -124,7 +125,7 @@ std::shared_ptr<QZIviConfiguration> QZIviConfigurations::Find(const Variant& ind
 std::shared_ptr<QZIviConfiguration> QZIviConfigurations::Item(const Variant& Index) {
     return Always(m_oErr, m_sPath + "Item", [&] {
         auto found = Find(Index);
-        if (!found) StdError(m_oErr, -31623, m_sPath + "Item");
+        if (!found) StdError(m_oErr, errid::kNoSuchConfiguration, m_sPath + "Item");
         return found;
     });
 }
@@ -156,14 +157,15 @@ void QZIviConfigurations::Remove(const Variant& Index) {
         } else {
             position = IndexOfName(Index.IsEmpty() ? std::string() : Index.AsText());
         }
-        if (position < 1 || position > Count()) StdError(m_oErr, -31611, m_sPath + "Remove");
+        if (position < 1 || position > Count())
+            StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         items_.erase(items_.begin() + (position - 1));
     });
 }
 
 void QZIviConfigurations::LoadConfiguration(const Variant& index) {
     const auto item = Find(index);
-    if (!item) StdError(m_oErr, -31623, m_sPath + "Item");
+    if (!item) StdError(m_oErr, errid::kNoSuchConfiguration, m_sPath + "Item");
     if (!m_oPropSet)
         RaiseRuntime(91, "Object variable not set: the configurations belong to no property set.");
     PropertyBag snapshot;
@@ -175,7 +177,7 @@ void QZIviConfigurations::LoadConfiguration(const Variant& index) {
 
 void QZIviConfigurations::StoreConfiguration(const Variant& index) {
     const auto item = Find(index);
-    if (!item) StdError(m_oErr, -31623, m_sPath + "Item");
+    if (!item) StdError(m_oErr, errid::kNoSuchConfiguration, m_sPath + "Item");
     if (!m_oPropSet)
         RaiseRuntime(91, "Object variable not set: the configurations belong to no property set.");
     PropertyBag snapshot;

@@ -1,4 +1,5 @@
 #include "qzivi/model/Sequences.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/model/PropertyBag.h"
@@ -33,7 +34,7 @@ void QZIviFgenSequenceItem::Waveform(const std::shared_ptr<QZIviFgenArbWaveform>
                 RaiseRuntime(91,
                              "Object variable not set: the sequence item belongs to no control.");
             if (!propSet->Waveforms()->ContainsObject(*value))
-                StdError(m_oErr, -31618, m_sPath + "Waveform");
+                StdError(m_oErr, errid::kForeignObject, m_sPath + "Waveform");
         }
         m_oWaveform = value;
     });
@@ -109,7 +110,7 @@ std::shared_ptr<QZIviFgenSequenceItem> QZIviFgenSequence::SequenceItem(const Var
             const std::int32_t position = Index.AsInt32();
             if (position >= 1 && position <= Count()) found = At(position);
         }
-        if (!found) StdError(m_oErr, -31626, m_sPath + "Item");
+        if (!found) StdError(m_oErr, errid::kNoSuchSequenceItem, m_sPath + "Item");
         return found;
     });
 }
@@ -135,7 +136,8 @@ QZIviFgenSequence::Add(const std::shared_ptr<QZIviFgenArbWaveform>& Waveform,
 void QZIviFgenSequence::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
         const std::int32_t position = Index.IsNumeric() ? Index.AsInt32() : 0;
-        if (position < 1 || position > Count()) StdError(m_oErr, -31611, m_sPath + "Remove");
+        if (position < 1 || position > Count())
+            StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         items_.erase(items_.begin() + (position - 1));
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
@@ -158,7 +160,7 @@ std::int32_t QZIviFgenSequence::DataSize() {
             std::int64_t total = 0;
             for (const auto& item : items_) {
                 if (!item->Waveform() || item->Iterations() < 1)
-                    StdError(m_oErr, -31616, m_sPath + "DataSize");
+                    StdError(m_oErr, errid::kInvalidSequence, m_sPath + "DataSize");
                 total +=
                     static_cast<std::int64_t>(item->Waveform()->DataSize()) * item->Iterations();
             }
@@ -188,7 +190,8 @@ SampleBlocks QZIviFgenSequence::GetDataSample(std::int32_t StartIndex, std::int3
             bool found = false;
             for (std::int32_t i = 1; i <= n; ++i) {
                 const auto& item = At(i);
-                if (!item->Waveform()) StdError(m_oErr, -31616, m_sPath + "GetDataSample");
+                if (!item->Waveform())
+                    StdError(m_oErr, errid::kInvalidSequence, m_sPath + "GetDataSample");
                 Ignoring([&] { size[i] = item->Waveform()->DataSize(); });
                 iters[i] = m_bCollapseIterations ? 1 : item->Iterations();
                 const std::int64_t total = size[i] * iters[i];
@@ -240,7 +243,7 @@ SampleBlocks QZIviFgenSequence::GetDataSample(std::int32_t StartIndex, std::int3
             if (Count != -1 && collected < Count) {
                 // Reported, but the blocks collected are the result all the same.
                 try {
-                    StdError(m_oErr, -31615, m_sPath + "GetDataSample");
+                    StdError(m_oErr, errid::kTooFewPoints, m_sPath + "GetDataSample");
                 } catch (...) {
                     HandleError("GetDataSample", 0, m_oErr.get());
                 }
@@ -326,7 +329,7 @@ void QZIviFgenSequence::Clone(QZIviFgenSequence& target) const {
 // ---- QZIviFgenSequences ---------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Item(const Variant& Index) {
-    return ItemOrRefuse(Index, -31627);
+    return ItemOrRefuse(Index, errid::kNoSuchSequence);
 }
 
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& SequenceName) {
@@ -343,7 +346,7 @@ std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& Se
 void QZIviFgenSequences::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
         const std::int32_t position = items_.RemovalPosition(Index);
-        if (position == 0) StdError(m_oErr, -31611, m_sPath + "Remove");
+        if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         Queue(items_.At(position)->SequenceHandle());
         items_.RemoveAt(position);
         if (const auto propSet = PropSet())

@@ -1,4 +1,5 @@
 #include "qzivi/model/Waveforms.h"
+#include "qzivi/driver/ErrorIds.h"
 
 #include "qzivi/model/CDblArrayFromFile.h"
 #include "qzivi/model/CIviFgenPropImp.h"
@@ -50,7 +51,7 @@ Points QZIviFgenArbWaveform::ReadData() {
         if (fromFile) result = GetDataSample(0, 1, -1);
     } catch (...) {
         m_lDataSize = 0;
-        StdError(m_oErr, -31613, m_sName);
+        StdError(m_oErr, errid::kInvalidWaveform, m_sName);
     }
     if (fromFile) {
         if (!result)
@@ -62,7 +63,7 @@ Points QZIviFgenArbWaveform::ReadData() {
     }
     if (!result) {
         m_lDataSize = 0;
-        StdError(m_oErr, -31613, m_sName);
+        StdError(m_oErr, errid::kInvalidWaveform, m_sName);
     }
     m_lDataSize = static_cast<std::int32_t>(result->size());
     return result;
@@ -99,7 +100,7 @@ Points QZIviFgenArbWaveform::GetDataSample(std::int32_t StartIndex, std::int32_t
         const WaitCursor wait;
         std::error_code error;
         if (m_sFilename.empty() || !std::filesystem::exists(m_sFilename, error))
-            StdError(m_oErr, -31613, m_sName);
+            StdError(m_oErr, errid::kInvalidWaveform, m_sName);
         std::vector<double> points =
             CDblArrayFromFile().RetrieveDblArray(m_lSource > 0 ? m_lSource : m_lPersistedWfmSource,
                                                  m_sFilename, StartIndex, Interval, Count);
@@ -233,7 +234,7 @@ void DeletedHandleQueue::RemoveDeletedHandleAt(std::int32_t i) {
 // ---- QZIviFgenArbWaveforms ---------------------------------------------------------------------
 
 std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Item(const Variant& Index) {
-    return ItemOrRefuse(Index, -31625);
+    return ItemOrRefuse(Index, errid::kNoSuchWaveform);
 }
 
 std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::string& WaveformName,
@@ -257,7 +258,7 @@ std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::stri
 void QZIviFgenArbWaveforms::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
         const std::int32_t position = items_.RemovalPosition(Index);
-        if (position == 0) StdError(m_oErr, -31611, m_sPath + "Remove");
+        if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         const auto waveform = items_.At(position);
         Queue(waveform->WaveformHandle());
         const auto propSet = PropSet();

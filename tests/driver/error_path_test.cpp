@@ -240,7 +240,7 @@ TEST(CheckForValidState, RefusesByThePresentState) {
     std::int32_t result = 0;
     auto refusal = [&](std::int32_t mask) -> std::int32_t {
         try {
-            err.CheckForValidState(mask, "Fgen1.Initiate", true, result);
+            result = err.CheckForValidState(mask, "Fgen1.Initiate", true);
         } catch (const Failure& f) {
             return f.Number();
         }

@@ -59,12 +59,12 @@ public:
     void state(std::int32_t newState); // fires StateChanged(new, old) first
 
     // Refuses, through DoStdError, a call whose forbidden mask meets the present state;
-    // otherwise gives the present state in `result` and, if asked, turns busy.
-    void CheckForValidState(std::int32_t forbidden, const std::string& source, bool setBusy,
-                            std::int32_t& result);
+    // otherwise returns the present state and, if asked, turns busy.
+    std::int32_t CheckForValidState(std::int32_t forbidden, const std::string& source,
+                                    bool setBusy);
     // The same, with the source made of a path and a word only when the call is refused.
-    void CheckForValidState(std::int32_t forbidden, std::string_view path, std::string_view word,
-                            bool setBusy, std::int32_t& result);
+    std::int32_t CheckForValidState(std::int32_t forbidden, std::string_view path,
+                                    std::string_view word, bool setBusy);
 
     ViSession hSession() const;
     void hSession(ViSession session);

@@ -5,6 +5,7 @@
 #include "qzivi/model/Channels.h"
 #include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/model/QZIviFgenInternalConfig.h"
+#include "qzivi/model/QZIviFgenTypes.h"
 #include "qzivi/model/Sequences.h"
 #include "qzivi/model/Waveforms.h"
 #include "qzivi/support/event.h"
@@ -18,38 +19,6 @@ namespace qzivi {
 
 class CIviErrorReport;
 class PropertyBag;
-
-enum QZIviFgenUIStyleTypes : std::int32_t {
-    qzivifgenInvisibleAtRuntime = 0,
-    qzivifgenAllowControl = 1,
-    qzivifgenDisplayOnly = 2,
-};
-
-enum QZIviFgenOutputModes : std::int32_t {
-    qzivifgenOutputFunc = 0,
-    qzivifgenOutputArb = 1,
-    qzivifgenOutputSeq = 2,
-};
-
-enum QZIviFgenRefClockSources : std::int32_t {
-    qzivifgenRefClockInternal = 0,
-    qzivifgenRefClockExternal = 1,
-    qzivifgenRefClockRTSIClock = 101,
-};
-
-enum QZIviFgenExtensions : std::int32_t {
-    qzivifgenNoExt = 0,
-    qzivifgenStdFuncExt = 1,
-    qzivifgenArbWfmExt = 2,
-    qzivifgenArbFrequencyExt = 4,
-    qzivifgenArbSeqExt = 8,
-    qzivifgenTriggerExt = 16,
-    qzivifgenInternalTriggerExt = 32,
-    qzivifgenSoftwareTriggerExt = 64,
-    qzivifgenBurstExt = 128,
-    qzivifgenModulateAMExt = 256,
-    qzivifgenModulateFMExt = 512,
-};
 
 class CIviFgenPropImp : public std::enable_shared_from_this<CIviFgenPropImp> {
 public:

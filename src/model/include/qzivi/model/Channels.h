@@ -3,6 +3,7 @@
 #pragma once
 
 #include "qzivi/model/ModelSupport.h"
+#include "qzivi/model/QZIviFgenTypes.h"
 #include "qzivi/support/event.h"
 
 #include <cstdint>
@@ -16,42 +17,10 @@ class PropertyBag;
 class QZIviFgenArbWaveform;
 class QZIviFgenSequence;
 
-enum QZIviFgenAMSources : std::int32_t { qzivifgenAMInternal = 0, qzivifgenAMExternal = 1 };
 enum QZIviFgenFMSources : std::int32_t { qzivifgenFMInternal = 0, qzivifgenFMExternal = 1 };
-enum QZIviFgenFuncWaveforms : std::int32_t {
-    qzivifgenWaveformSine = 1,
-    qzivifgenWaveformSquare = 2,
-    qzivifgenWaveformTriangle = 3,
-    qzivifgenWaveformRampUp = 4,
-    qzivifgenWaveformRampDown = 5,
-    qzivifgenWaveformDC = 6,
-};
 enum QZIviFgenOperationModes : std::int32_t {
     qzivifgenOperateContinuous = 0,
     qzivifgenOperateBurst = 1
-};
-enum QZIviFgenTriggerSources : std::int32_t {
-    qzivifgenExternalTrigger = 1,
-    qzivifgenSoftwareTrigger = 2,
-    qzivifgenInternalTrigger = 3,
-    qzivifgenTTL0 = 111,
-    qzivifgenTTL1 = 112,
-    qzivifgenTTL2 = 113,
-    qzivifgenTTL3 = 114,
-    qzivifgenTTL4 = 115,
-    qzivifgenTTL5 = 116,
-    qzivifgenTTL6 = 117,
-    qzivifgenTTL7 = 118,
-    qzivifgenECL0 = 119,
-    qzivifgenECL1 = 120,
-    qzivifgenPXIStar = 131,
-    qzivifgenRTSI0 = 141,
-    qzivifgenRTSI1 = 142,
-    qzivifgenRTSI2 = 143,
-    qzivifgenRTSI3 = 144,
-    qzivifgenRTSI4 = 145,
-    qzivifgenRTSI5 = 146,
-    qzivifgenRTSI6 = 147,
 };
 
 // A pure state holder: values are stored as given; the instrument judges them at Configure.

@@ -1,6 +1,7 @@
 // The instrument's internal modulation sources and internal trigger, one for the control.
 #pragma once
 
+#include "qzivi/model/QZIviFgenTypes.h"
 #include <cstdint>
 #include <memory>
 #include <string>
@@ -10,24 +11,6 @@ namespace qzivi {
 class CIviErrorReport;
 class CIviFgenPropImp;
 class PropertyBag;
-
-enum QZIviFgenAMInternalWaveforms : std::int32_t {
-    qzivifgenAMInternalSine = 1,
-    qzivifgenAMInternalSquare = 2,
-    qzivifgenAMInternalTriangle = 3,
-    qzivifgenAMInternalRampUp = 4,
-    qzivifgenAMInternalRampDown = 5,
-    qzivifgenAMInternalDC = 6,
-};
-
-enum QZIviFgenFMInternalWaveforms : std::int32_t {
-    qzivifgenFMInternalSine = 1,
-    qzivifgenFMInternalSquare = 2,
-    qzivifgenFMInternalTriangle = 3,
-    qzivifgenFMInternalRampUp = 4,
-    qzivifgenFMInternalRampDown = 5,
-    qzivifgenFMInternalDC = 6,
-};
 
 class QZIviFgenInternalConfig {
 public:

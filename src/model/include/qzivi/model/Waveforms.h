@@ -3,6 +3,7 @@
 #pragma once
 
 #include "qzivi/model/ModelSupport.h"
+#include "qzivi/model/QZIviFgenTypes.h"
 #include "qzivi/support/event.h"
 
 #include <cstdint>
@@ -15,19 +16,6 @@ namespace qzivi {
 class CIviErrorReport;
 class CIviFgenPropImp;
 class PropertyBag;
-
-enum QZIviFgenWaveformSources : std::int32_t {
-    qzivifgenpersisted = 0,
-    qzivifgenASCIIFile = 1,
-    qzivifgen2ByteInteger = 2,
-    qzivifgen4ByteInteger = 3,
-};
-
-enum QZIviFgenAutoNormalizeModes : std::int32_t {
-    qzivifgenNoAutoNormalize = 0,
-    qzivifgenNormalize = 1,
-    qzivifgenNormalizeAndRemoveOffset = 2,
-};
 
 // Points are shared and never changed once made; null stands for "no points".
 using Points = std::shared_ptr<const std::vector<double>>;
