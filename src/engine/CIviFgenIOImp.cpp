@@ -7,6 +7,7 @@
 #include "qzivi/support/failure.h"
 
 #include <cstring>
+#include <stdexcept>
 
 namespace qzivi {
 
@@ -23,6 +24,20 @@ void Ignoring(F&& step) {
 
 bool Has(std::int32_t extensions, std::int32_t flag) {
     return (extensions & flag) != 0;
+}
+
+// The type the driver is asked about for a value of this kind.
+AttrType TypeOf(PropertyKind kind) {
+    switch (kind) {
+    case PropertyKind::Double:
+        return AttrType::Real64;
+    case PropertyKind::Bool:
+        return AttrType::Boolean;
+    case PropertyKind::Text:
+        return AttrType::String;
+    default:
+        return AttrType::Int32;
+    }
 }
 
 // What Configure stores as a boolean: -1 for true, as it is persisted.
@@ -139,22 +154,20 @@ void CIviFgenIOImp::Run(bool internalCall) {
         IviFgen_ConfigureFMEnabled(vi, channel->Name().c_str(), VI_FALSE);
     }
     const std::int32_t mode = prop.OutputMode();
-    Checked(IviFgen_ConfigureOutputMode(vi, mode), "Base", "",
-            {{IVIFGEN_ATTR_OUTPUT_MODE, AttrType::Int32, mode, Path(), "OutputMode"}});
+    Checked(IviFgen_ConfigureOutputMode(vi, mode), "Base", "", prop,
+            {{IVIFGEN_ATTR_OUTPUT_MODE, mode}});
     if (mode != qzivifgenOutputFunc && !m_bArbMemoryCleared) {
         IviFgen_ClearArbWaveform(vi, IVIFGEN_VAL_ALL_WAVEFORMS);
         m_bArbMemoryCleared = true;
     }
     ClearDeletedHandles();
     CreateMissingHandles();
-    Checked(IviFgen_ConfigureRefClockSource(vi, prop.RefClockSource()), "Base", "",
-            {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, AttrType::Int32, prop.RefClockSource(), Path(),
-              "RefClockSource"}});
+    Checked(IviFgen_ConfigureRefClockSource(vi, prop.RefClockSource()), "Base", "", prop,
+            {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, prop.RefClockSource()}});
     if (Has(ext, qzivifgenArbWfmExt) && !Has(ext, qzivifgenArbFrequencyExt) &&
         mode != qzivifgenOutputFunc)
-        Checked(IviFgen_ConfigureSampleRate(vi, prop.ArbSampleRate()), "Base", "",
-                {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, AttrType::Real64, prop.ArbSampleRate(), Path(),
-                  "ArbSampleRate"}});
+        Checked(IviFgen_ConfigureSampleRate(vi, prop.ArbSampleRate()), "Base", "", prop,
+                {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, prop.ArbSampleRate()}});
 
     bool anyTrigger = false, anyAM = false, anyFM = false;
     for (const auto& channel : channels)
@@ -164,36 +177,28 @@ void CIviFgenIOImp::Run(bool internalCall) {
     if (Has(ext, qzivifgenModulateAMExt) && anyAM)
         Checked(IviFgen_ConfigureAMInternal(vi, in.AMInternalDepth(), in.AMInternalWaveform(),
                                             in.AMInternalFrequency()),
-                "ModulateAM", "",
-                {{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, AttrType::Real64, in.AMInternalDepth(), in.Path(),
-                  "AMInternalDepth"},
-                 {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, AttrType::Int32, in.AMInternalWaveform(),
-                  in.Path(), "AMInternalWaveform"},
-                 {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, AttrType::Real64, in.AMInternalFrequency(),
-                  in.Path(), "AMInternalFrequency"}});
+                "ModulateAM", "", in,
+                {{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, in.AMInternalDepth()},
+                 {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, in.AMInternalWaveform()},
+                 {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, in.AMInternalFrequency()}});
     if (Has(ext, qzivifgenModulateFMExt) && anyFM)
         Checked(IviFgen_ConfigureFMInternal(vi, in.FMInternalDeviation(), in.FMInternalWaveform(),
                                             in.FMInternalFrequency()),
-                "ModulateFM", "",
-                {{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, AttrType::Real64, in.FMInternalDeviation(),
-                  in.Path(), "FMInternalDeviation"},
-                 {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, AttrType::Int32, in.FMInternalWaveform(),
-                  in.Path(), "FMInternalWaveform"},
-                 {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, AttrType::Real64, in.FMInternalFrequency(),
-                  in.Path(), "FMInternalFrequency"}});
+                "ModulateFM", "", in,
+                {{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, in.FMInternalDeviation()},
+                 {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, in.FMInternalWaveform()},
+                 {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, in.FMInternalFrequency()}});
     if (Has(ext, qzivifgenInternalTriggerExt) && anyTrigger)
         Checked(IviFgen_ConfigureInternalTriggerRate(vi, in.InternalTriggerRate()),
-                "InternalTrigger", "",
-                {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, AttrType::Real64, in.InternalTriggerRate(),
-                  in.Path(), "InternalTriggerRate"}});
+                "InternalTrigger", "", in,
+                {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, in.InternalTriggerRate()}});
 
     for (const auto& channel : channels) {
         const ViBoolean enabled = Stored(channel->OutputEnabled());
         Checked(IviFgen_ConfigureOutputEnabled(vi, channel->Name().c_str(), enabled), "Base",
-                channel->Name(),
-                {{IVIFGEN_ATTR_OUTPUT_ENABLED, AttrType::Boolean,
-                  static_cast<std::int32_t>(static_cast<std::int16_t>(enabled)), channel->Path(),
-                  "OutputEnabled"}});
+                channel->Name(), *channel,
+                {{IVIFGEN_ATTR_OUTPUT_ENABLED,
+                  static_cast<std::int32_t>(static_cast<std::int16_t>(enabled))}});
     }
     if (prop.AutoStopStart()) Initiate(true);
     ClearDeletedHandles();
@@ -213,20 +218,15 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         IviFgen_ConfigureOutputImpedance(vi, name.c_str(), ch.OutputImpedance());
     if (impedance == IVI_ERROR_UNKNOWN_CHANNEL_NAME)
         m_oErr->DoStdError(errid::kInvalidChannelName, name, 0, "");
-    Checked(impedance, "Base", name,
-            {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, AttrType::Real64, ch.OutputImpedance(), path,
-              "OutputImpedance"}});
-    Checked(IviFgen_ConfigureOperationMode(vi, name.c_str(), ch.OperationMode()), "Base", name,
-            {{IVIFGEN_ATTR_OPERATION_MODE, AttrType::Int32, ch.OperationMode(), path,
-              "OperationMode"}});
+    Checked(impedance, "Base", name, ch, {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, ch.OutputImpedance()}});
+    Checked(IviFgen_ConfigureOperationMode(vi, name.c_str(), ch.OperationMode()), "Base", name, ch,
+            {{IVIFGEN_ATTR_OPERATION_MODE, ch.OperationMode()}});
     if (Has(ext, qzivifgenBurstExt) && ch.OperationMode() == qzivifgenOperateBurst)
-        Checked(IviFgen_ConfigureBurstCount(vi, name.c_str(), ch.BurstCount()), "Burst", name,
-                {{IVIFGEN_ATTR_BURST_COUNT, AttrType::Int32, ch.BurstCount(), path, "BurstCount"}});
+        Checked(IviFgen_ConfigureBurstCount(vi, name.c_str(), ch.BurstCount()), "Burst", name, ch,
+                {{IVIFGEN_ATTR_BURST_COUNT, ch.BurstCount()}});
     if (Has(ext, qzivifgenTriggerExt)) {
         Checked(IviFgen_ConfigureTriggerSource(vi, name.c_str(), ch.TriggerSource()), "Trigger",
-                name,
-                {{IVIFGEN_ATTR_TRIGGER_SOURCE, AttrType::Int32, ch.TriggerSource(), path,
-                  "TriggerSource"}});
+                name, ch, {{IVIFGEN_ATTR_TRIGGER_SOURCE, ch.TriggerSource()}});
         if (ch.TriggerSource() == qzivifgenInternalTrigger) anyTrigger = true;
     }
 
@@ -234,20 +234,15 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
     case qzivifgenOutputFunc:
         if (!Has(ext, qzivifgenStdFuncExt))
             m_oErr->DoStdError(errid::kOutputModeExtensionOff, path + "OutputMode", 0, "");
-        Checked(
-            IviFgen_ConfigureStandardWaveform(vi, name.c_str(), ch.FuncWaveform(),
-                                              ch.FuncAmplitude(), ch.FuncDCOffset(),
-                                              ch.FuncFrequency(), ch.FuncStartPhase()),
-            "StdFunc", name,
-            {{IVIFGEN_ATTR_FUNC_WAVEFORM, AttrType::Int32, ch.FuncWaveform(), path, "FuncWaveform"},
-             {IVIFGEN_ATTR_FUNC_AMPLITUDE, AttrType::Real64, ch.FuncAmplitude(), path,
-              "FuncAmplitude"},
-             {IVIFGEN_ATTR_FUNC_DC_OFFSET, AttrType::Real64, ch.FuncDCOffset(), path,
-              "FuncDCOffset"},
-             {IVIFGEN_ATTR_FUNC_FREQUENCY, AttrType::Real64, ch.FuncFrequency(), path,
-              "FuncFrequency"},
-             {IVIFGEN_ATTR_FUNC_START_PHASE, AttrType::Real64, ch.FuncStartPhase(), path,
-              "FuncStartPhase"}});
+        Checked(IviFgen_ConfigureStandardWaveform(vi, name.c_str(), ch.FuncWaveform(),
+                                                  ch.FuncAmplitude(), ch.FuncDCOffset(),
+                                                  ch.FuncFrequency(), ch.FuncStartPhase()),
+                "StdFunc", name, ch,
+                {{IVIFGEN_ATTR_FUNC_WAVEFORM, ch.FuncWaveform()},
+                 {IVIFGEN_ATTR_FUNC_AMPLITUDE, ch.FuncAmplitude()},
+                 {IVIFGEN_ATTR_FUNC_DC_OFFSET, ch.FuncDCOffset()},
+                 {IVIFGEN_ATTR_FUNC_FREQUENCY, ch.FuncFrequency()},
+                 {IVIFGEN_ATTR_FUNC_START_PHASE, ch.FuncStartPhase()}});
         break;
     case qzivifgenOutputArb: {
         if (!Has(ext, qzivifgenArbWfmExt))
@@ -260,15 +255,13 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         const std::int32_t handle = ch.ArbWaveform() ? ch.ArbWaveform()->WaveformHandle() : 0;
         Checked(
             IviFgen_ConfigureArbWaveform(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()),
-            "ArbWfm", name,
-            {{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, AttrType::Int32, handle, path, "ArbWaveform"},
-             {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
-             {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
+            "ArbWfm", name, ch,
+            {{IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE, handle},
+             {IVIFGEN_ATTR_ARB_GAIN, ch.ArbGain()},
+             {IVIFGEN_ATTR_ARB_OFFSET, ch.ArbOffset()}});
         if (Has(ext, qzivifgenArbFrequencyExt))
             Checked(IviFgen_ConfigureArbFrequency(vi, name.c_str(), ch.ArbFrequency()),
-                    "ArbFrequency", name,
-                    {{IVIFGEN_ATTR_ARB_FREQUENCY, AttrType::Real64, ch.ArbFrequency(), path,
-                      "ArbFrequency"}});
+                    "ArbFrequency", name, ch, {{IVIFGEN_ATTR_ARB_FREQUENCY, ch.ArbFrequency()}});
         break;
     }
     case qzivifgenOutputSeq: {
@@ -282,10 +275,10 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
         const std::int32_t handle = ch.Sequence() ? ch.Sequence()->SequenceHandle() : 0;
         Checked(
             IviFgen_ConfigureArbSequence(vi, name.c_str(), handle, ch.ArbGain(), ch.ArbOffset()),
-            "ArbSeq", name,
-            {{IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, AttrType::Int32, handle, path, "Sequence"},
-             {IVIFGEN_ATTR_ARB_GAIN, AttrType::Real64, ch.ArbGain(), path, "ArbGain"},
-             {IVIFGEN_ATTR_ARB_OFFSET, AttrType::Real64, ch.ArbOffset(), path, "ArbOffset"}});
+            "ArbSeq", name, ch,
+            {{IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE, handle},
+             {IVIFGEN_ATTR_ARB_GAIN, ch.ArbGain()},
+             {IVIFGEN_ATTR_ARB_OFFSET, ch.ArbOffset()}});
         break;
     }
     default:
@@ -294,23 +287,21 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
 
     if (Has(ext, qzivifgenModulateAMExt)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.AMEnabled());
-        Checked(IviFgen_ConfigureAMEnabled(vi, name.c_str(), on), "ModulateAM", name,
-                {{IVIFGEN_ATTR_AM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
-                  "AMEnabled"}});
+        Checked(IviFgen_ConfigureAMEnabled(vi, name.c_str(), on), "ModulateAM", name, ch,
+                {{IVIFGEN_ATTR_AM_ENABLED, static_cast<std::int32_t>(on)}});
         if (ch.AMEnabled()) {
             Checked(IviFgen_ConfigureAMSource(vi, name.c_str(), ch.AMSource()), "ModulateAM", name,
-                    {{IVIFGEN_ATTR_AM_SOURCE, AttrType::Int32, ch.AMSource(), path, "AMSource"}});
+                    ch, {{IVIFGEN_ATTR_AM_SOURCE, ch.AMSource()}});
             if (ch.AMSource() == qzivifgenAMInternal) anyAM = true;
         }
     }
     if (Has(ext, qzivifgenModulateFMExt)) {
         const ViBoolean on = CIviErrorReport::ToViBoolean(ch.FMEnabled());
-        Checked(IviFgen_ConfigureFMEnabled(vi, name.c_str(), on), "ModulateFM", name,
-                {{IVIFGEN_ATTR_FM_ENABLED, AttrType::Boolean, static_cast<std::int32_t>(on), path,
-                  "FMEnabled"}});
+        Checked(IviFgen_ConfigureFMEnabled(vi, name.c_str(), on), "ModulateFM", name, ch,
+                {{IVIFGEN_ATTR_FM_ENABLED, static_cast<std::int32_t>(on)}});
         if (ch.FMEnabled()) {
             Checked(IviFgen_ConfigureFMSource(vi, name.c_str(), ch.FMSource()), "ModulateFM", name,
-                    {{IVIFGEN_ATTR_FM_SOURCE, AttrType::Int32, ch.FMSource(), path, "FMSource"}});
+                    ch, {{IVIFGEN_ATTR_FM_SOURCE, ch.FMSource()}});
             if (ch.FMSource() == qzivifgenFMInternal) anyFM = true;
         }
     }
@@ -318,13 +309,18 @@ void CIviFgenIOImp::ConfigureChannel(QZIviFgenChannel& ch, bool& anyTrigger, boo
 
 // The pattern of every driver call of a run: a refused call is asked about each of its values in
 // turn, and the first value the driver would not take names the property at fault.
+template <typename Owner>
 void CIviFgenIOImp::Checked(ViStatus status, const char* word, const std::string& channel,
-                            std::initializer_list<Param> params) {
+                            const Owner& owner, std::initializer_list<Param> params) {
     m_oErr->IviCheckError(status, word, 8, "");
     if (status == 0) return;
-    for (const auto& p : params)
-        if (!CheckNumber(p.type, p.id, p.value, channel.c_str()))
-            m_oErr->DoStdError(errid::kInvalidArgument, p.owner + p.name, status, channel);
+    for (const auto& p : params) {
+        const PropertyInfo* row = FindByAttribute(Owner::Properties(), p.id);
+        if (!row) throw std::logic_error("no property row sends attribute " + std::to_string(p.id));
+        if (!CheckNumber(TypeOf(row->kind), p.id, p.value, channel.c_str()))
+            m_oErr->DoStdError(errid::kInvalidArgument, owner.Path() + std::string(row->name),
+                               status, channel);
+    }
     // Every value would be taken: the driver's own status stands. An error raises; a warning
     // fires and the run goes on.
     m_oErr->IviCheckError(status, "", 0, "");

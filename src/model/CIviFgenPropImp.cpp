@@ -18,55 +18,53 @@ std::shared_ptr<CIviFgenPropImp> CIviFgenPropImp::Create() {
     return set;
 }
 
-void CIviFgenPropImp::ArbSampleRate(double value) {
-    m_dArbSampleRate = value;
-    PropertyChange("ArbSampleRate");
+std::span<const PropertyRow<CIviFgenPropImp>> CIviFgenPropImp::Properties() {
+    using R = CIviFgenPropImp;
+    static const PropertyRow<R> rows[] = {
+        Field<&R::m_dArbSampleRate>("ArbSampleRate", 1000.0, IVIFGEN_ATTR_ARB_SAMPLE_RATE),
+        Field<&R::m_bAutoStopStart>("AutoStopStart", true),
+        Field<&R::m_lExtensions>("Extensions", qzivifgenStdFuncExt | qzivifgenArbWfmExt),
+        Field<&R::m_lOutputMode>("OutputMode", qzivifgenOutputFunc, IVIFGEN_ATTR_OUTPUT_MODE),
+        Field<&R::m_lRefClockSource>("RefClockSource", qzivifgenRefClockInternal,
+                                     IVIFGEN_ATTR_REF_CLOCK_SOURCE),
+        [] {
+            auto row = Field<&R::m_sLogicalName>("LogicalName", "SampleFGen");
+            row.alwaysStored = true;
+            return row;
+        }(),
+        Field<&R::m_bAutoConfigure>("AutoConfigure", false),
+        Field<&R::m_bEnabled>("Enabled", true),
+        Accessor<R>(
+            "UIStyle", std::int32_t{qzivifgenAllowControl},
+            [](const R& r) -> PropertyValue { return r.m_lUIStyle; },
+            [](R& r, const PropertyValue& v) {
+                const std::int32_t style = std::get<std::int32_t>(v);
+                if (style < qzivifgenInvisibleAtRuntime || style > qzivifgenDisplayOnly)
+                    StdError(r.m_oErr, errid::kInvalidArgument, r.m_sPath + "UIStyle");
+                r.m_lUIStyle = style;
+            }),
+        Accessor<R>(
+            "ExceptionOnError", true,
+            [](const R& r) -> PropertyValue { return r.ExceptionOnError(); },
+            [](R& r, const PropertyValue& v) {
+                if (r.m_oErr) r.m_oErr->ExceptionOnError(std::get<bool>(v));
+            }),
+    };
+    return rows;
 }
 
-void CIviFgenPropImp::AutoStopStart(bool value) {
-    m_bAutoStopStart = value;
-    PropertyChange("AutoStopStart");
+CIviFgenPropImp::CIviFgenPropImp() {
+    PutDefaults(Properties(), *this);
 }
 
-void CIviFgenPropImp::Extensions(std::int32_t value) {
-    m_lExtensions = value;
-    PropertyChange("Extensions");
+void CIviFgenPropImp::Put(const PropertyRow<CIviFgenPropImp>& row, const PropertyValue& value) {
+    row.put(*this, value);
+    PropertyChange(std::string(row.name));
 }
 
-void CIviFgenPropImp::OutputMode(std::int32_t value) {
-    m_lOutputMode = value;
-    PropertyChange("OutputMode");
-}
-
-void CIviFgenPropImp::RefClockSource(std::int32_t value) {
-    m_lRefClockSource = value;
-    PropertyChange("RefClockSource");
-}
-
-void CIviFgenPropImp::LogicalName(const std::string& value) {
-    m_sLogicalName = value;
-    PropertyChange("LogicalName");
-}
-
-void CIviFgenPropImp::AutoConfigure(bool value) {
-    m_bAutoConfigure = value;
-    PropertyChange("AutoConfigure");
-}
-
-void CIviFgenPropImp::Enabled(bool value) {
-    m_bEnabled = value;
-    PropertyChange("Enabled");
-}
-
-void CIviFgenPropImp::UIStyle(std::int32_t value) {
-    if (value < 0 || value > 2) {
-        if (m_oErr) m_oErr->DoStdError(errid::kInvalidArgument, m_sPath + "UIStyle");
-        throw Failure(errid::kInvalidArgument, m_sPath + "UIStyle",
-                      "An invalid argument has been passed to a property or method. (" + m_sPath +
-                          "UIStyle)");
-    }
-    m_lUIStyle = value;
-    PropertyChange("UIStyle");
+bool CIviFgenPropImp::ExceptionOnError() const {
+    return m_oErr ? m_oErr->ExceptionOnError()
+                  : std::get<bool>(Properties()[kExceptionOnError].initial);
 }
 
 const std::shared_ptr<QZIviConfigurations>& CIviFgenPropImp::Configurations() {
@@ -74,23 +72,8 @@ const std::shared_ptr<QZIviConfigurations>& CIviFgenPropImp::Configurations() {
     return m_oConfigurations;
 }
 
-void CIviFgenPropImp::ExceptionOnError(bool value) {
-    m_bExceptionOnError = value;
-    if (m_oErr) m_oErr->ExceptionOnError(value);
-    PropertyChange("ExceptionOnError");
-}
-
 void CIviFgenPropImp::InitProperties() {
-    ArbSampleRate(1000.0);
-    AutoStopStart(true);
-    Extensions(3);
-    OutputMode(0);
-    RefClockSource(0);
-    LogicalName("SampleFGen");
-    AutoConfigure(false);
-    Enabled(true);
-    UIStyle(1);
-    ExceptionOnError(true);
+    PutDefaults(Properties(), *this, WithNotice());
     m_oInternal->InitProperties();
     m_oChannels->InitProperties();
     m_oWaveforms->InitProperties();
@@ -99,16 +82,7 @@ void CIviFgenPropImp::InitProperties() {
 
 void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& prefix,
                                      bool withConfigurations) {
-    ArbSampleRate(bag.ReadDouble(prefix + "ArbSampleRate", 1000));
-    AutoStopStart(bag.ReadBool(prefix + "AutoStopStart", true));
-    Extensions(bag.ReadInt32(prefix + "Extensions", 3));
-    OutputMode(bag.ReadInt32(prefix + "OutputMode", 0));
-    RefClockSource(bag.ReadInt32(prefix + "RefClockSource", 0));
-    LogicalName(bag.ReadText(prefix + "LogicalName", "SampleFGen"));
-    AutoConfigure(bag.ReadBool(prefix + "AutoConfigure", false));
-    Enabled(bag.ReadBool(prefix + "Enabled", true));
-    UIStyle(bag.ReadInt32(prefix + "UIStyle", 1));
-    ExceptionOnError(bag.ReadBool(prefix + "ExceptionOnError", true));
+    ReadRows(Properties(), *this, bag, prefix, WithNotice());
     m_oInternal->ReadProperties(bag, prefix);
     m_oWaveforms->ReadProperties(bag, prefix);
     m_oSequences->ReadProperties(bag, prefix);
@@ -118,16 +92,7 @@ void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& 
 
 void CIviFgenPropImp::WriteProperties(PropertyBag& bag, const std::string& prefix,
                                       bool withConfigurations) const {
-    bag.WriteDouble(prefix + "ArbSampleRate", m_dArbSampleRate, 1000);
-    bag.WriteBool(prefix + "AutoStopStart", m_bAutoStopStart, true);
-    bag.WriteInt32(prefix + "Extensions", m_lExtensions, 3);
-    bag.WriteInt32(prefix + "OutputMode", m_lOutputMode, 0);
-    bag.WriteInt32(prefix + "RefClockSource", m_lRefClockSource, 0);
-    bag.WriteText(prefix + "LogicalName", m_sLogicalName); // always stored
-    bag.WriteBool(prefix + "AutoConfigure", m_bAutoConfigure, false);
-    bag.WriteBool(prefix + "Enabled", m_bEnabled, true);
-    bag.WriteInt32(prefix + "UIStyle", m_lUIStyle, 1);
-    bag.WriteBool(prefix + "ExceptionOnError", m_bExceptionOnError, true);
+    WriteRows(Properties(), *this, bag, prefix);
     m_oInternal->WriteProperties(bag, prefix);
     m_oChannels->WriteProperties(bag, prefix);
     m_oSequences->WriteProperties(bag, prefix);
@@ -139,16 +104,7 @@ std::shared_ptr<CIviFgenPropImp>
 CIviFgenPropImp::Clone(std::shared_ptr<CIviFgenPropImp> target) const {
     if (!target) target = Create();
     target->Attach(m_oErr);
-    target->ArbSampleRate(ArbSampleRate());
-    target->AutoStopStart(AutoStopStart());
-    target->Extensions(Extensions());
-    target->OutputMode(OutputMode());
-    target->RefClockSource(RefClockSource());
-    target->LogicalName(LogicalName());
-    target->AutoConfigure(AutoConfigure());
-    target->Enabled(Enabled());
-    target->UIStyle(UIStyle());
-    target->ExceptionOnError(ExceptionOnError());
+    CopyRows(Properties(), *this, *target, WithNotice());
     m_oInternal->Clone(*target->m_oInternal);
     m_oWaveforms->Clone(*target->m_oWaveforms);
     m_oSequences->Clone(*target->m_oSequences);

@@ -70,52 +70,53 @@ void QZIviFgenChannel::SetPath(const std::string& parentPath) {
     m_sPath = JoinPath(parentPath, "Item(\"" + m_sName + "\")");
 }
 
+std::span<const PropertyRow<QZIviFgenChannel>> QZIviFgenChannel::Properties() {
+    using C = QZIviFgenChannel;
+    static const PropertyRow<C> rows[] = {
+        Accessor<C>(
+            "Name", std::string(), [](const C& c) -> PropertyValue { return c.m_sName; },
+            [](C& c, const PropertyValue& v) { c.Name(std::get<std::string>(v)); }),
+        Field<&C::m_bAMEnabled>("AMEnabled", false, IVIFGEN_ATTR_AM_ENABLED),
+        Field<&C::m_lAMSource>("AMSource", qzivifgenAMInternal, IVIFGEN_ATTR_AM_SOURCE),
+        Field<&C::m_dArbFrequency>("ArbFrequency", 1000, IVIFGEN_ATTR_ARB_FREQUENCY),
+        Field<&C::m_dArbGain>("ArbGain", 1, IVIFGEN_ATTR_ARB_GAIN),
+        Field<&C::m_dArbOffset>("ArbOffset", 0, IVIFGEN_ATTR_ARB_OFFSET),
+        Field<&C::m_lBurstCount>("BurstCount", 2, IVIFGEN_ATTR_BURST_COUNT),
+        Field<&C::m_bFMEnabled>("FMEnabled", false, IVIFGEN_ATTR_FM_ENABLED),
+        Field<&C::m_lFMSource>("FMSource", qzivifgenFMInternal, IVIFGEN_ATTR_FM_SOURCE),
+        Field<&C::m_dFuncAmplitude>("FuncAmplitude", 2, IVIFGEN_ATTR_FUNC_AMPLITUDE),
+        Field<&C::m_dFuncDCOffset>("FuncDCOffset", 0, IVIFGEN_ATTR_FUNC_DC_OFFSET),
+        Field<&C::m_dFuncDutyCycleHigh>("FuncDutyCycleHigh", 50, IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH),
+        Field<&C::m_dFuncFrequency>("FuncFrequency", 1000, IVIFGEN_ATTR_FUNC_FREQUENCY),
+        Field<&C::m_dFuncStartPhase>("FuncStartPhase", 0, IVIFGEN_ATTR_FUNC_START_PHASE),
+        Field<&C::m_lFuncWaveform>("FuncWaveform", qzivifgenWaveformSine,
+                                   IVIFGEN_ATTR_FUNC_WAVEFORM),
+        Field<&C::m_lOperationMode>("OperationMode", qzivifgenOperateContinuous,
+                                    IVIFGEN_ATTR_OPERATION_MODE),
+        Field<&C::m_bOutputEnabled>("OutputEnabled", true, IVIFGEN_ATTR_OUTPUT_ENABLED),
+        Field<&C::m_dOutputImpedance>("OutputImpedance", 50, IVIFGEN_ATTR_OUTPUT_IMPEDANCE),
+        Field<&C::m_lTriggerSource>("TriggerSource", qzivifgenExternalTrigger,
+                                    IVIFGEN_ATTR_TRIGGER_SOURCE),
+        Reference<C>("ArbWaveform", IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE),
+        Reference<C>("Sequence", IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE),
+    };
+    return rows;
+}
+
+QZIviFgenChannel::QZIviFgenChannel() {
+    PutDefaults(Properties(), *this);
+}
+
 void QZIviFgenChannel::InitProperties() {
-    Name("");
-    AMEnabled(false);
-    AMSource(0);
-    ArbFrequency(1000);
-    ArbGain(1);
-    ArbOffset(0);
+    PutDefaults(Properties(), *this);
     ArbWaveform(nullptr);
-    BurstCount(2);
-    FMEnabled(false);
-    FMSource(0);
-    FuncAmplitude(2);
-    FuncDCOffset(0);
-    FuncDutyCycleHigh(50);
-    FuncFrequency(1000);
-    FuncStartPhase(0);
-    FuncWaveform(qzivifgenWaveformSine);
-    OperationMode(qzivifgenOperateContinuous);
-    OutputEnabled(true);
-    OutputImpedance(50);
     Sequence(nullptr);
-    TriggerSource(qzivifgenExternalTrigger);
     m_sUniqueId = NewUniqueId();
 }
 
 void QZIviFgenChannel::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
     const std::string p = BagPrefix(prefix, "Channel");
-    Name(bag.ReadText(p + "Name", ""));
-    AMEnabled(bag.ReadBool(p + "AMEnabled", false));
-    AMSource(bag.ReadInt32(p + "AMSource", 0));
-    ArbFrequency(bag.ReadDouble(p + "ArbFrequency", 1000));
-    ArbGain(bag.ReadDouble(p + "ArbGain", 1));
-    ArbOffset(bag.ReadDouble(p + "ArbOffset", 0));
-    BurstCount(bag.ReadInt32(p + "BurstCount", 2));
-    FMEnabled(bag.ReadBool(p + "FMEnabled", false));
-    FMSource(bag.ReadInt32(p + "FMSource", 0));
-    FuncAmplitude(bag.ReadDouble(p + "FuncAmplitude", 2));
-    FuncDCOffset(bag.ReadDouble(p + "FuncDCOffset", 0));
-    FuncDutyCycleHigh(bag.ReadDouble(p + "FuncDutyCycleHigh", 50));
-    FuncFrequency(bag.ReadDouble(p + "FuncFrequency", 1000));
-    FuncStartPhase(bag.ReadDouble(p + "FuncStartPhase", 0));
-    FuncWaveform(bag.ReadInt32(p + "FuncWaveform", qzivifgenWaveformSine));
-    OperationMode(bag.ReadInt32(p + "OperationMode", qzivifgenOperateContinuous));
-    OutputEnabled(bag.ReadBool(p + "OutputEnabled", true));
-    OutputImpedance(bag.ReadDouble(p + "OutputImpedance", 50));
-    TriggerSource(bag.ReadInt32(p + "TriggerSource", qzivifgenExternalTrigger));
+    ReadRows(Properties(), *this, bag, p);
     m_sUniqueId = NewUniqueId();
     const auto propSet = PropSet();
     if (!propSet) return;
@@ -127,25 +128,7 @@ void QZIviFgenChannel::ReadProperties(const PropertyBag& bag, const std::string&
 
 void QZIviFgenChannel::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
     const std::string p = BagPrefix(prefix, "Channel");
-    bag.WriteText(p + "Name", m_sName, "");
-    bag.WriteBool(p + "AMEnabled", m_bAMEnabled, false);
-    bag.WriteInt32(p + "AMSource", m_lAMSource, 0);
-    bag.WriteDouble(p + "ArbFrequency", m_dArbFrequency, 1000);
-    bag.WriteDouble(p + "ArbGain", m_dArbGain, 1);
-    bag.WriteDouble(p + "ArbOffset", m_dArbOffset, 0);
-    bag.WriteInt32(p + "BurstCount", m_lBurstCount, 2);
-    bag.WriteBool(p + "FMEnabled", m_bFMEnabled, false);
-    bag.WriteInt32(p + "FMSource", m_lFMSource, 0);
-    bag.WriteDouble(p + "FuncAmplitude", m_dFuncAmplitude, 2);
-    bag.WriteDouble(p + "FuncDCOffset", m_dFuncDCOffset, 0);
-    bag.WriteDouble(p + "FuncDutyCycleHigh", m_dFuncDutyCycleHigh, 50);
-    bag.WriteDouble(p + "FuncFrequency", m_dFuncFrequency, 1000);
-    bag.WriteDouble(p + "FuncStartPhase", m_dFuncStartPhase, 0);
-    bag.WriteInt32(p + "FuncWaveform", m_lFuncWaveform, qzivifgenWaveformSine);
-    bag.WriteInt32(p + "OperationMode", m_lOperationMode, qzivifgenOperateContinuous);
-    bag.WriteBool(p + "OutputEnabled", m_bOutputEnabled, true);
-    bag.WriteDouble(p + "OutputImpedance", m_dOutputImpedance, 50);
-    bag.WriteInt32(p + "TriggerSource", m_lTriggerSource, qzivifgenExternalTrigger);
+    WriteRows(Properties(), *this, bag, p);
     const auto propSet = PropSet();
     const auto waveformIndex =
         m_oArbWaveform && propSet ? propSet->Waveforms()->IndexOfName(m_oArbWaveform->Name()) : 0;
@@ -156,26 +139,8 @@ void QZIviFgenChannel::WriteProperties(PropertyBag& bag, const std::string& pref
 }
 
 void QZIviFgenChannel::Clone(QZIviFgenChannel& target) const {
-    target.Name(m_sName);
-    target.AMEnabled(m_bAMEnabled);
-    target.AMSource(m_lAMSource);
-    target.ArbFrequency(m_dArbFrequency);
-    target.ArbGain(m_dArbGain);
-    target.ArbOffset(m_dArbOffset);
+    CopyRows(Properties(), *this, target);
     target.ArbWaveform(m_oArbWaveform);
-    target.BurstCount(m_lBurstCount);
-    target.FMEnabled(m_bFMEnabled);
-    target.FMSource(m_lFMSource);
-    target.FuncAmplitude(m_dFuncAmplitude);
-    target.FuncDCOffset(m_dFuncDCOffset);
-    target.FuncDutyCycleHigh(m_dFuncDutyCycleHigh);
-    target.FuncFrequency(m_dFuncFrequency);
-    target.FuncStartPhase(m_dFuncStartPhase);
-    target.FuncWaveform(m_lFuncWaveform);
-    target.OperationMode(m_lOperationMode);
-    target.OutputEnabled(m_bOutputEnabled);
-    target.OutputImpedance(m_dOutputImpedance);
-    target.TriggerSource(m_lTriggerSource);
     target.Sequence(m_oSequence);
     target.UniqueId(m_sUniqueId);
 }

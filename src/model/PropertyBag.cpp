@@ -120,6 +120,14 @@ void PropertyBag::Remove(std::string_view name) {
         if (i > position) --i;
 }
 
+std::vector<std::string> PropertyBag::Names() const {
+    std::vector<std::string> names;
+    names.reserve(entries_.size());
+    for (const auto& entry : entries_)
+        names.push_back(entry.name);
+    return names;
+}
+
 bool PropertyBag::Contains(std::string_view name) const {
     return Find(name) != nullptr;
 }

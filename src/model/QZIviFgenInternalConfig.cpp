@@ -15,46 +15,44 @@ void QZIviFgenInternalConfig::SetPath(const std::string& parentPath) {
     m_sPath = JoinPath(parentPath, "Internal");
 }
 
+std::span<const PropertyRow<QZIviFgenInternalConfig>> QZIviFgenInternalConfig::Properties() {
+    using C = QZIviFgenInternalConfig;
+    static const PropertyRow<C> rows[] = {
+        Field<&C::m_dAMInternalDepth>("AMInternalDepth", 50, IVIFGEN_ATTR_AM_INTERNAL_DEPTH),
+        Field<&C::m_dAMInternalFrequency>("AMInternalFrequency", 1000,
+                                          IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY),
+        Field<&C::m_lAMInternalWaveform>("AMInternalWaveform", qzivifgenAMInternalSine,
+                                         IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM),
+        Field<&C::m_dFMInternalDeviation>("FMInternalDeviation", 100,
+                                          IVIFGEN_ATTR_FM_INTERNAL_DEVIATION),
+        Field<&C::m_dFMInternalFrequency>("FMInternalFrequency", 1000,
+                                          IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY),
+        Field<&C::m_lFMInternalWaveform>("FMInternalWaveform", qzivifgenFMInternalSine,
+                                         IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM),
+        Field<&C::m_dInternalTriggerRate>("InternalTriggerRate", 1000,
+                                          IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE),
+    };
+    return rows;
+}
+
+QZIviFgenInternalConfig::QZIviFgenInternalConfig() {
+    PutDefaults(Properties(), *this);
+}
+
 void QZIviFgenInternalConfig::InitProperties() {
-    AMInternalDepth(50);
-    AMInternalFrequency(1000);
-    AMInternalWaveform(1);
-    FMInternalDeviation(100);
-    FMInternalFrequency(1000);
-    FMInternalWaveform(1);
-    InternalTriggerRate(1000);
+    PutDefaults(Properties(), *this);
 }
 
 void QZIviFgenInternalConfig::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
-    const std::string p = BagPrefix(prefix, "Internal");
-    AMInternalDepth(bag.ReadDouble(p + "AMInternalDepth", 50));
-    AMInternalFrequency(bag.ReadDouble(p + "AMInternalFrequency", 1000));
-    AMInternalWaveform(bag.ReadInt32(p + "AMInternalWaveform", 1));
-    FMInternalDeviation(bag.ReadDouble(p + "FMInternalDeviation", 100));
-    FMInternalFrequency(bag.ReadDouble(p + "FMInternalFrequency", 1000));
-    FMInternalWaveform(bag.ReadInt32(p + "FMInternalWaveform", 1));
-    InternalTriggerRate(bag.ReadDouble(p + "InternalTriggerRate", 1000));
+    ReadRows(Properties(), *this, bag, BagPrefix(prefix, "Internal"));
 }
 
 void QZIviFgenInternalConfig::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
-    const std::string p = BagPrefix(prefix, "Internal");
-    bag.WriteDouble(p + "AMInternalDepth", AMInternalDepth(), 50);
-    bag.WriteDouble(p + "AMInternalFrequency", AMInternalFrequency(), 1000);
-    bag.WriteInt32(p + "AMInternalWaveform", AMInternalWaveform(), 1);
-    bag.WriteDouble(p + "FMInternalDeviation", FMInternalDeviation(), 100);
-    bag.WriteDouble(p + "FMInternalFrequency", FMInternalFrequency(), 1000);
-    bag.WriteInt32(p + "FMInternalWaveform", FMInternalWaveform(), 1);
-    bag.WriteDouble(p + "InternalTriggerRate", InternalTriggerRate(), 1000);
+    WriteRows(Properties(), *this, bag, BagPrefix(prefix, "Internal"));
 }
 
 void QZIviFgenInternalConfig::Clone(QZIviFgenInternalConfig& target) const {
-    target.AMInternalDepth(AMInternalDepth());
-    target.AMInternalFrequency(AMInternalFrequency());
-    target.AMInternalWaveform(AMInternalWaveform());
-    target.FMInternalDeviation(FMInternalDeviation());
-    target.FMInternalFrequency(FMInternalFrequency());
-    target.FMInternalWaveform(FMInternalWaveform());
-    target.InternalTriggerRate(InternalTriggerRate());
+    CopyRows(Properties(), *this, target);
 }
 
 } // namespace qzivi

@@ -126,7 +126,7 @@ private:
     std::string lastLogicalName_;
     CIviSaveErrorInfo savedError_;
 
-    bool exceptionOnError_ = false;
+    bool exceptionOnError_ = true; // the control's default, so a set read before any put agrees
     std::int32_t LastErrorNumber_ = 0;
     std::string LastErrorDescription_;
     std::string LastErrorSource_;

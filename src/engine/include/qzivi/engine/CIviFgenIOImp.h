@@ -64,21 +64,19 @@ public:
     Event<std::int32_t, const std::string&, const std::string&> Error;
 
 private:
-    // One parameter of a checked call: what to ask the driver if the call is refused. Made on
-    // every call, so it copies nothing.
+    // One value of a checked call: its attribute, which names the owner's property row if the
+    // call is refused.
     struct Param {
         template <typename Number>
-        Param(ViAttr id, AttrType type, Number value, const std::string& owner, const char* name)
-            : id(id), type(type), value(static_cast<double>(value)), owner(owner), name(name) {}
+        Param(ViAttr id, Number value) : id(id), value(static_cast<double>(value)) {}
         ViAttr id;
-        AttrType type; // Boolean, Int32 or Real64
         double value;
-        const std::string& owner; // Path of the object that owns the property
-        const char* name;
     };
 
     void Run(bool internalCall);
-    void Checked(ViStatus status, const char* word, const std::string& channel,
+    // `owner` is the object whose property rows and Path name a refused value.
+    template <typename Owner>
+    void Checked(ViStatus status, const char* word, const std::string& channel, const Owner& owner,
                  std::initializer_list<Param> params);
     void CheckExtensions(std::int32_t extensions, std::string_view capabilities);
     bool CheckNumber(AttrType type, ViAttr id, double value, const char* channel);

@@ -3,6 +3,7 @@
 #pragma once
 
 #include "qzivi/model/Channels.h"
+#include "qzivi/model/PropertyTable.h"
 #include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/model/QZIviFgenInternalConfig.h"
 #include "qzivi/model/QZIviFgenTypes.h"
@@ -35,32 +36,34 @@ public:
     std::shared_ptr<CIviFgenPropImp> Clone(std::shared_ptr<CIviFgenPropImp> target) const;
 
     double ArbSampleRate() const { return m_dArbSampleRate; }
-    void ArbSampleRate(double value);
+    void ArbSampleRate(double value) { Put(kArbSampleRate, value); }
     bool AutoStopStart() const { return m_bAutoStopStart; }
-    void AutoStopStart(bool value);
+    void AutoStopStart(bool value) { Put(kAutoStopStart, value); }
     std::int32_t Extensions() const { return m_lExtensions; }
-    void Extensions(std::int32_t value);
+    void Extensions(std::int32_t value) { Put(kExtensions, value); }
     std::int32_t OutputMode() const { return m_lOutputMode; }
-    void OutputMode(std::int32_t value);
+    void OutputMode(std::int32_t value) { Put(kOutputMode, value); }
     std::int32_t RefClockSource() const { return m_lRefClockSource; }
-    void RefClockSource(std::int32_t value);
+    void RefClockSource(std::int32_t value) { Put(kRefClockSource, value); }
     const std::shared_ptr<QZIviFgenInternalConfig>& Internal() const { return m_oInternal; }
     const std::shared_ptr<QZIviFgenChannels>& Channels() const { return m_oChannels; }
     const std::shared_ptr<QZIviFgenArbWaveforms>& Waveforms() const { return m_oWaveforms; }
     const std::shared_ptr<QZIviFgenSequences>& Sequences() const { return m_oSequences; }
-    void LogicalName(const std::string& value);
+    void LogicalName(const std::string& value) { Put(kLogicalName, value); }
     const std::string& LogicalName() const { return m_sLogicalName; }
-    void AutoConfigure(bool value);
+    void AutoConfigure(bool value) { Put(kAutoConfigure, value); }
     bool AutoConfigure() const { return m_bAutoConfigure; }
-    void Enabled(bool value);
+    void Enabled(bool value) { Put(kEnabled, value); }
     bool Enabled() const { return m_bEnabled; }
     // Values outside 0 to 2 are refused with -30002 and change nothing.
-    void UIStyle(std::int32_t value);
+    void UIStyle(std::int32_t value) { Put(kUIStyle, value); }
     std::int32_t UIStyle() const { return m_lUIStyle; }
     // Tells the collection that this set owns it before handing it out.
     const std::shared_ptr<QZIviConfigurations>& Configurations();
-    void ExceptionOnError(bool value);
-    bool ExceptionOnError() const { return m_bExceptionOnError; }
+    // Kept in the error report, where the object model reads it; a set not yet attached to one
+    // answers the default.
+    void ExceptionOnError(bool value) { Put(kExceptionOnError, value); }
+    bool ExceptionOnError() const;
     void DraggingKnob(bool value) { m_bDraggingKnob = value; }
     bool DraggingKnob() const { return m_bDraggingKnob; }
 
@@ -77,23 +80,47 @@ public:
         CollectionChanged;
     Event<const std::string&> PropertyChange;
 
-private:
-    CIviFgenPropImp() = default;
+    // The ten values in the order of their notices and bag keys.
+    static std::span<const PropertyRow<CIviFgenPropImp>> Properties();
 
-    double m_dArbSampleRate = 1000.0;
-    bool m_bAutoStopStart = true;
-    std::int32_t m_lExtensions = 3;
-    std::int32_t m_lOutputMode = 0;
-    std::int32_t m_lRefClockSource = 0;
+private:
+    enum Row : std::size_t {
+        kArbSampleRate,
+        kAutoStopStart,
+        kExtensions,
+        kOutputMode,
+        kRefClockSource,
+        kLogicalName,
+        kAutoConfigure,
+        kEnabled,
+        kUIStyle,
+        kExceptionOnError,
+    };
+    CIviFgenPropImp();
+    // Every put: the row stores (UIStyle checks first), then PropertyChange fires.
+    void Put(const PropertyRow<CIviFgenPropImp>& row, const PropertyValue& value);
+    void Put(Row row, PropertyValue value) { Put(Properties()[row], value); }
+    struct WithNotice {
+        void operator()(CIviFgenPropImp& set, const PropertyRow<CIviFgenPropImp>& row,
+                        const PropertyValue& value) const {
+            set.Put(row, value);
+        }
+    };
+
+    // Their defaults are the table's.
+    double m_dArbSampleRate{};
+    bool m_bAutoStopStart{};
+    std::int32_t m_lExtensions{};
+    std::int32_t m_lOutputMode{};
+    std::int32_t m_lRefClockSource{};
     std::shared_ptr<QZIviFgenInternalConfig> m_oInternal;
     std::shared_ptr<QZIviFgenChannels> m_oChannels;
     std::shared_ptr<QZIviFgenArbWaveforms> m_oWaveforms;
     std::shared_ptr<QZIviFgenSequences> m_oSequences;
-    std::string m_sLogicalName = "SampleFGen";
-    bool m_bAutoConfigure = false;
-    bool m_bEnabled = true;
-    std::int32_t m_lUIStyle = 1;
-    bool m_bExceptionOnError = true;
+    std::string m_sLogicalName;
+    bool m_bAutoConfigure{};
+    bool m_bEnabled{};
+    std::int32_t m_lUIStyle{};
     std::shared_ptr<QZIviConfigurations> m_oConfigurations;
     bool m_bDraggingKnob = false;
     std::shared_ptr<CIviErrorReport> m_oErr;

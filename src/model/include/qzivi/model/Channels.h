@@ -3,6 +3,7 @@
 #pragma once
 
 #include "qzivi/model/ModelSupport.h"
+#include "qzivi/model/PropertyTable.h"
 #include "qzivi/model/QZIviFgenTypes.h"
 #include "qzivi/support/event.h"
 
@@ -26,6 +27,8 @@ enum QZIviFgenOperationModes : std::int32_t {
 // A pure state holder: values are stored as given; the instrument judges them at Configure.
 class QZIviFgenChannel {
 public:
+    QZIviFgenChannel();
+
     // ---- Public ----
     const std::string& Name() const { return m_sName; }
     void Name(const std::string& value);
@@ -86,30 +89,34 @@ public:
     const std::string& UniqueId() const { return m_sUniqueId; }
     void UniqueId(const std::string& value) { m_sUniqueId = value; }
 
+    // The properties in the order of their notices and bag keys; the references come last.
+    static std::span<const PropertyRow<QZIviFgenChannel>> Properties();
+
 private:
     void OnCollectionChanged(const std::string& name, std::int32_t kind);
 
+    // Their defaults are the table's.
     std::string m_sName;
-    bool m_bAMEnabled = false;
-    std::int32_t m_lAMSource = 0;
-    double m_dArbFrequency = 1000;
-    double m_dArbGain = 1;
-    double m_dArbOffset = 0;
+    bool m_bAMEnabled{};
+    std::int32_t m_lAMSource{};
+    double m_dArbFrequency{};
+    double m_dArbGain{};
+    double m_dArbOffset{};
     std::shared_ptr<QZIviFgenArbWaveform> m_oArbWaveform;
-    std::int32_t m_lBurstCount = 2;
-    bool m_bFMEnabled = false;
-    std::int32_t m_lFMSource = 0;
-    double m_dFuncAmplitude = 2;
-    double m_dFuncDCOffset = 0;
-    double m_dFuncDutyCycleHigh = 50;
-    double m_dFuncFrequency = 1000;
-    double m_dFuncStartPhase = 0;
-    std::int32_t m_lFuncWaveform = qzivifgenWaveformSine;
-    std::int32_t m_lOperationMode = qzivifgenOperateContinuous;
-    bool m_bOutputEnabled = true;
-    double m_dOutputImpedance = 50;
+    std::int32_t m_lBurstCount{};
+    bool m_bFMEnabled{};
+    std::int32_t m_lFMSource{};
+    double m_dFuncAmplitude{};
+    double m_dFuncDCOffset{};
+    double m_dFuncDutyCycleHigh{};
+    double m_dFuncFrequency{};
+    double m_dFuncStartPhase{};
+    std::int32_t m_lFuncWaveform{};
+    std::int32_t m_lOperationMode{};
+    bool m_bOutputEnabled{};
+    double m_dOutputImpedance{};
     std::shared_ptr<QZIviFgenSequence> m_oSequence;
-    std::int32_t m_lTriggerSource = qzivifgenExternalTrigger;
+    std::int32_t m_lTriggerSource{};
     std::shared_ptr<CIviErrorReport> m_oErr;
     std::weak_ptr<CIviFgenPropImp> m_oPropSet;
     std::string m_sPath;

@@ -73,6 +73,8 @@ public:
     void WriteBytes(std::string_view name, SharedBytes value);
 
     bool Contains(std::string_view name) const;
+    // The names in the order they were first stored.
+    std::vector<std::string> Names() const;
     std::size_t Size() const { return entries_.size(); }
     void Clear();
 

@@ -1,6 +1,7 @@
 // The instrument's internal modulation sources and internal trigger, one for the control.
 #pragma once
 
+#include "qzivi/model/PropertyTable.h"
 #include "qzivi/model/QZIviFgenTypes.h"
 #include <cstdint>
 #include <memory>
@@ -14,6 +15,8 @@ class PropertyBag;
 
 class QZIviFgenInternalConfig {
 public:
+    QZIviFgenInternalConfig();
+
     double AMInternalDepth() const { return m_dAMInternalDepth; }
     void AMInternalDepth(double value) { m_dAMInternalDepth = value; }
     double AMInternalFrequency() const { return m_dAMInternalFrequency; }
@@ -39,14 +42,18 @@ public:
     void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
     void Clone(QZIviFgenInternalConfig& target) const;
 
+    // The properties in the order of their bag keys.
+    static std::span<const PropertyRow<QZIviFgenInternalConfig>> Properties();
+
 private:
-    double m_dAMInternalDepth = 50;
-    double m_dAMInternalFrequency = 1000;
-    std::int32_t m_lAMInternalWaveform = 1;
-    double m_dFMInternalDeviation = 100;
-    double m_dFMInternalFrequency = 1000;
-    std::int32_t m_lFMInternalWaveform = 1;
-    double m_dInternalTriggerRate = 1000;
+    // Their defaults are the table's.
+    double m_dAMInternalDepth{};
+    double m_dAMInternalFrequency{};
+    std::int32_t m_lAMInternalWaveform{};
+    double m_dFMInternalDeviation{};
+    double m_dFMInternalFrequency{};
+    std::int32_t m_lFMInternalWaveform{};
+    double m_dInternalTriggerRate{};
     std::shared_ptr<CIviErrorReport> m_oErr;
     std::weak_ptr<CIviFgenPropImp> m_oPropSet;
     std::string m_sPath;
