@@ -45,6 +45,9 @@ ViBoolean Stored(bool value) {
     return value ? static_cast<ViBoolean>(-1) : ViBoolean{0};
 }
 
+// Ends a run after a warning of a checked call; caught by the run itself.
+struct RunEnded {};
+
 } // namespace
 
 CIviFgenIOImp::~CIviFgenIOImp() {
@@ -125,6 +128,9 @@ void CIviFgenIOImp::Configure(bool internalCall) {
             runOwnsState = false; // refused below; the state is another's
         m_oErr->CheckForValidState(IviStateClosed | IviStateBusy, Path(), "Configure", true);
         Run(internalCall);
+    } catch (const RunEnded&) {
+        // A warning ended the run: it has fired already, and nothing is raised.
+        if (m_oErr->state() > IviStateClosed) m_oErr->state(IviStateInitialized);
     } catch (...) {
         if (runOwnsState && m_oErr->state() > IviStateClosed) m_oErr->state(IviStateInitialized);
         ReRaise();
@@ -321,9 +327,16 @@ void CIviFgenIOImp::Checked(ViStatus status, const char* word, const std::string
             m_oErr->DoStdError(errid::kInvalidArgument, owner.Path() + std::string(row->name),
                                status, channel);
     }
-    // Every value would be taken: the driver's own status stands. An error raises; a warning
-    // fires and the run goes on.
+    // Every value would be taken: the driver's own status stands and ends the run. A known error
+    // raises here and a known warning fires; a status the mapping does not know is reported as
+    // the unexpected failure or a warning of its own, so that the run never ends unexplained.
     m_oErr->IviCheckError(status, "", 0, "");
+    if (CIviErrorReport::MapIviError(status) == status) {
+        if (status < 0)
+            m_oErr->DoStdError(errid::kUnexpected, Path() + "Configure", status, channel);
+        m_oErr->Warning(status, Path() + "Configure", m_oErr->BuildIviDescription(status, channel));
+    }
+    throw RunEnded{};
 }
 
 void CIviFgenIOImp::CheckExtensions(std::int32_t extensions, std::string_view capabilities) {

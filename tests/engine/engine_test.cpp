@@ -14,8 +14,10 @@
 namespace qzivi {
 namespace {
 
+using ::testing::AnyOf;
 using ::testing::ElementsAre;
 using ::testing::HasSubstr;
+using ::testing::Not;
 using ::testing::StartsWith;
 
 class EngineTest : public ::testing::Test {
@@ -225,19 +227,55 @@ TEST_F(EngineTest, WithoutAutoStopStartGenerationIsLeftAlone) {
         << "only the final switch, not the disabling";
 }
 
-TEST_F(EngineTest, AWarningFiresAndTheRunGoesOn) {
+// A checked call that answers with a warning ends the run as an error would, but raises nothing.
+TEST_F(EngineTest, AWarningFromACheckedCallEndsTheRun) {
     fgen_->Channels()->Add();
     Open("Warn=ConfigureStandardWaveform:0x3FFA4001");
-    fgen_->Configure();
+    ivi::TraceRecorder trace;
+    EXPECT_EQ(Raised([&] { fgen_->Configure(); }), 0);
     EXPECT_EQ(warnings_, (std::vector<std::int32_t>{31501}));
     EXPECT_TRUE(errors_.empty());
+    EXPECT_EQ(State(), IviStateInitialized);
+    EXPECT_EQ(configured_, 0);
+    const auto calls = trace.Functions();
+    const auto at = std::find(calls.begin(), calls.end(), "IviFgen_ConfigureStandardWaveform");
+    ASSERT_NE(at, calls.end());
+    for (auto later = at + 1; later != calls.end(); ++later)
+        EXPECT_THAT(*later, Not(AnyOf(StartsWith("IviFgen_Configure"),
+                                      StartsWith("IviFgen_InitiateGeneration"))))
+            << "nothing is sent after the warning";
+
+    // A call that warns outside the checked pattern only fires: the capability read.
+    warnings_.clear();
+    fgen_->CloseSession();
+    Open("Warn=GetAttributeViString:0x3FFA4001:1");
+    fgen_->Configure();
+    EXPECT_EQ(warnings_, (std::vector<std::int32_t>{31501}));
     EXPECT_EQ(State(), IviStateConfigured);
     EXPECT_EQ(configured_, 1);
 }
 
+// A status the mapping does not know ends the run too, with the unexpected failure for an error.
+TEST_F(EngineTest, AnUnknownStatusEndsTheRunAndIsReported) {
+    fgen_->Channels()->Add();
+    Open("Fail=ConfigureStandardWaveform:0xBFFB0001");
+    EXPECT_EQ(Raised([&] { fgen_->Configure(); }), -30000);
+    EXPECT_THAT(lastText_, HasSubstr("[IVI Error Code:  BFFB0001]"));
+    EXPECT_EQ(State(), IviStateInitialized);
+    EXPECT_EQ(configured_, 0);
+    fgen_->CloseSession();
+    errors_.clear();
+    Open("Warn=ConfigureStandardWaveform:0x3FFB0001");
+    EXPECT_EQ(Raised([&] { fgen_->Configure(); }), 0);
+    EXPECT_EQ(warnings_, (std::vector<std::int32_t>{0x3FFB0001}));
+    EXPECT_TRUE(errors_.empty());
+    EXPECT_EQ(State(), IviStateInitialized);
+    EXPECT_EQ(configured_, 0);
+}
+
 TEST_F(EngineTest, ACallFromAnEventHandlerDuringARunIsRefused) {
     fgen_->Channels()->Add();
-    Open("Warn=ConfigureStandardWaveform");
+    Open("Warn=GetAttributeViString");
     std::int32_t inner = 0;
     auto c = fgen_->IviWarning.Connect([&](std::int32_t, const std::string&, const std::string&) {
         inner = Raised([&] { fgen_->Configure(); });
