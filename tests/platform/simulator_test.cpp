@@ -10,6 +10,7 @@ using qzivi::test::LastError;
 using qzivi::test::Session;
 using qzivi::test::StoreScope;
 using ::testing::HasSubstr;
+using ::testing::StartsWith;
 
 namespace {
 
@@ -343,6 +344,30 @@ TEST_F(SimulatorTest, FailsANamedFunctionAsOftenAsAsked) {
     EXPECT_DOUBLE_EQ(s.Real(IVIFGEN_ATTR_OUTPUT_IMPEDANCE), 50) << "a failed call changes nothing";
     EXPECT_EQ(IviFgen_ConfigureOutputImpedance(vi, "Channel1", 75), VI_SUCCESS);
     EXPECT_DOUBLE_EQ(s.Real(IVIFGEN_ATTR_OUTPUT_IMPEDANCE), 75);
+}
+
+// No C++ exception crosses a C entry: one of a type nobody knows becomes an IVI error with its
+// text, on the session's record, and the session goes on working.
+TEST_F(SimulatorTest, AnExceptionOfUnknownTypeBecomesAnErrorStatus) {
+    Session s("DriverSetup=Throw=ConfigureOutputImpedance:1:1");
+    const ViSession vi = s.vi();
+    EXPECT_EQ(IviFgen_ConfigureOutputImpedance(vi, "Channel1", 75), IVI_ERROR_CANNOT_RECOVER);
+    EXPECT_EQ(s.Elaboration(), "ConfigureOutputImpedance: an exception of an unknown type");
+    ViStatus code = 0;
+    ViChar text[256] = {};
+    IviFgen_GetError(vi, &code, sizeof text, text);
+    EXPECT_EQ(code, IVI_ERROR_CANNOT_RECOVER);
+    EXPECT_THAT(text, StartsWith("Unrecoverable failure. ConfigureOutputImpedance: an exception"));
+    EXPECT_DOUBLE_EQ(s.Real(IVIFGEN_ATTR_OUTPUT_IMPEDANCE), 50) << "the call changed nothing";
+    EXPECT_EQ(IviFgen_ConfigureOutputImpedance(vi, "Channel1", 75), VI_SUCCESS);
+
+    // At the open, without a session yet: the thread's record answers.
+    ViSession none = 0;
+    EXPECT_EQ(IviFgen_InitWithOptions("SampleFGen", VI_FALSE, VI_FALSE,
+                                      "DriverSetup=Throw=InitWithOptions", &none),
+              IVI_ERROR_CANNOT_RECOVER);
+    EXPECT_EQ(none, 0);
+    EXPECT_THAT(LastError(VI_NULL), HasSubstr("an exception of an unknown type"));
 }
 
 TEST_F(SimulatorTest, RefusesAGivenValueWhereverItIsSet) {

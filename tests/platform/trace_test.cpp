@@ -10,6 +10,7 @@ using qzivi::ivi::TraceRecorder;
 using qzivi::test::Session;
 using qzivi::test::StoreScope;
 using ::testing::ElementsAre;
+using ::testing::HasSubstr;
 using ::testing::StartsWith;
 
 namespace {
@@ -46,6 +47,33 @@ TEST(Trace, RecordsEveryCallInOrderWithArgumentsAndStatus) {
     EXPECT_THAT(r[3].arguments, ::testing::EndsWith("\"Channel1\", 1250104, &1000"));
     for (const auto& record : r)
         EXPECT_THAT(record.Line(), StartsWith(record.function + "("));
+}
+
+// A download shows its points by their count and the values at both ends, so that the trace tells
+// which waveform went to the instrument.
+TEST(Trace, ShowsArraysByLengthAndTheirEnds) {
+    StoreScope scope;
+    Session s;
+    std::vector<ViReal64> points;
+    for (int k = 0; k < 10; ++k)
+        points.push_back(k / 10.0);
+    TraceRecorder recorder;
+    ViInt32 wfm = 0, seq = 0;
+    ASSERT_EQ(IviFgen_CreateArbWaveform(s.vi(), 10, points.data(), &wfm), VI_SUCCESS);
+    const ViInt32 handles[] = {wfm, wfm}, loops[] = {3, 1};
+    ASSERT_EQ(IviFgen_CreateArbSequence(s.vi(), 2, handles, loops, &seq), VI_SUCCESS);
+    const ViStatus refused = IviFgen_CreateArbWaveform(s.vi(), 2, points.data(), &wfm);
+    ASSERT_LT(refused, 0);
+    const auto& r = recorder.Records();
+    ASSERT_EQ(r.size(), 3u);
+    EXPECT_THAT(r[0].arguments,
+                HasSubstr(", 10, [10: 0, 0.1, 0.2 ... 0.7, 0.8, 0.9], &" + std::to_string(wfm)));
+    const std::string h = std::to_string(wfm);
+    EXPECT_THAT(r[1].arguments, HasSubstr(", 2, [2: " + h + ", " + h + "], [2: 3, 1], &"));
+    EXPECT_THAT(r[2].arguments, HasSubstr(", 2, [2: 0, 0.1], &?")) << "nothing came back";
+    std::vector<ViReal64> volts(8);
+    ASSERT_EQ(QZIvi_RenderOutput(s.vi(), "Channel1", 0, 1e-6, 8, volts.data()), VI_SUCCESS);
+    EXPECT_THAT(recorder.Records().back().arguments, HasSubstr(", 8, &[8: 0, 0, 0 ... 0, 0, 0]"));
 }
 
 TEST(Trace, WritesOneLineACallToTheFileNamedByTheEnvironment) {

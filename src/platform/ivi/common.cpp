@@ -1,3 +1,4 @@
+#include "qzivi/c_boundary.h"
 #include "qzivi/ivi_common.h"
 
 #include <algorithm>
@@ -158,6 +159,40 @@ bool ParseBoolOption(const Option& option) {
         if (EqualsNoCase(option.value, no)) return false;
     throw StatusError(IVI_ERROR_BAD_OPTION_VALUE,
                       "option " + option.name + " takes a boolean, not \"" + option.value + "\"");
+}
+
+} // namespace qzivi::ivi
+
+namespace qzivi::ivi {
+
+ViStatus ErrorRecord::Set(ViStatus failure, const char* function, const char* what) noexcept {
+    status = failure;
+    pending = true;
+    try {
+        elaboration = std::string(function) + ": " + what;
+    } catch (...) {
+        elaboration.clear();
+    }
+    return failure;
+}
+
+ViStatus ErrorRecord::Report(ViStatus* code, ViInt32 bufferSize, ViChar description[]) noexcept {
+    ViStatus result = 0;
+    try {
+        ViChar text[256];
+        StatusMessage(status, text);
+        result = CopyText(status == 0 ? std::string() : std::string(text) + " " + elaboration,
+                          bufferSize, description);
+    } catch (...) { // no room for the text: the status alone
+        result = CopyText("", bufferSize, description);
+    }
+    if (code != nullptr) *code = status;
+    if (bufferSize != 0) {
+        status = 0;
+        elaboration.clear();
+        pending = false;
+    }
+    return result;
 }
 
 } // namespace qzivi::ivi

@@ -3,6 +3,7 @@
 #include "qzivi/ivi_common.h"
 
 #include <cstdio>
+#include <cstring>
 #include <fstream>
 #include <mutex>
 
@@ -22,6 +23,73 @@ void UpdateSwitch() {
     detail::g_traceOn.store(g_sink != nullptr || g_file.is_open());
 }
 } // namespace
+
+// ---- Arguments ---------------------------------------------------------------------------------
+
+void AppendArgument(std::string& out, ViInt32 v, ViStatus) {
+    out += std::to_string(v);
+}
+void AppendArgument(std::string& out, ViUInt32 v, ViStatus) {
+    out += std::to_string(v);
+}
+void AppendArgument(std::string& out, ViBoolean v, ViStatus) {
+    out += std::to_string(v);
+}
+void AppendArgument(std::string& out, ViReal64 v, ViStatus) {
+    char text[32];
+    std::snprintf(text, sizeof text, "%.15g", v);
+    out += text;
+}
+void AppendArgument(std::string& out, ViConstString v, ViStatus) {
+    out += v != nullptr ? "\"" + std::string(v) + "\"" : "NULL";
+}
+void AppendArgument(std::string& out, TraceChannel v, ViStatus status) {
+    AppendArgument(out, v.name, status);
+}
+void AppendArgument(std::string& out, TraceOutText v, ViStatus status) {
+    if (v.buffer == nullptr || v.size <= 0 || status < 0) {
+        out += "&?";
+        return;
+    }
+    out += "&\"" + std::string(v.buffer, ::strnlen(v.buffer, static_cast<size_t>(v.size))) + "\"";
+}
+
+namespace {
+// "[count: first, second, third, ..., third last, second last, last]"; all of a short array.
+template <typename T>
+void AppendValues(std::string& out, const T* data, ViInt32 count) {
+    constexpr ViInt32 kEnds = 3;
+    if (data == nullptr) {
+        out += "NULL";
+        return;
+    }
+    out += "[" + std::to_string(count) + ":";
+    for (ViInt32 i = 0; i < count; ++i) {
+        const bool gap = count > 2 * kEnds && i == kEnds;
+        if (gap) i = count - kEnds;
+        out += i == 0 ? " " : gap ? " ... " : ", ";
+        AppendArgument(out, data[i], VI_SUCCESS);
+    }
+    out += "]";
+}
+} // namespace
+
+void AppendArgument(std::string& out, TraceArray<ViReal64> v, ViStatus) {
+    AppendValues(out, v.data, v.count);
+}
+void AppendArgument(std::string& out, TraceArray<ViInt32> v, ViStatus) {
+    AppendValues(out, v.data, v.count);
+}
+void AppendArgument(std::string& out, TraceOutArray v, ViStatus status) {
+    if (v.data != nullptr && status < 0) {
+        out += "&?";
+        return;
+    }
+    if (v.data != nullptr) out += "&";
+    AppendValues(out, v.data, v.count);
+}
+
+// ---- Records -----------------------------------------------------------------------------------
 
 std::string TraceRecord::Line() const {
     char tail[64];

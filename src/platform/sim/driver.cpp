@@ -3,6 +3,7 @@
 
 #include "faults.h"
 #include "instrument.h"
+#include "qzivi/c_boundary.h"
 #include "qzivi/ivi_common.h"
 
 #include <array>
@@ -13,7 +14,10 @@
 
 namespace {
 
+using qzivi::ivi::CEntry;
 using qzivi::ivi::CopyText;
+using qzivi::ivi::ErrorRecord;
+using qzivi::ivi::SessionTable;
 using qzivi::ivi::StatusError;
 using qzivi::sim::AttrValue;
 using qzivi::sim::Faults;
@@ -25,8 +29,7 @@ struct Session {
         : instrument(std::move(faults), std::move(resource), std::move(driverSetup)) {}
     std::mutex mutex;
     Instrument instrument;
-    ViStatus lastStatus = 0;
-    std::string elaboration;
+    ErrorRecord record;
 };
 
 // Session numbers of this driver start here, so that a class driver's number passed by mistake
@@ -35,63 +38,43 @@ struct Session {
 #ifndef QZSIM_FIRST_SESSION
 #define QZSIM_FIRST_SESSION 0x5100
 #endif
-constexpr ViSession kFirstSession = QZSIM_FIRST_SESSION;
-constexpr size_t kSlots = 256;
-
-std::array<std::atomic<Session*>, kSlots> g_sessions{};
-std::mutex g_openClose;
+SessionTable<Session> g_sessions(QZSIM_FIRST_SESSION);
 
 // The error record of calls that have no session: a failed open, a wrong session number.
-thread_local ViStatus t_lastStatus = 0;
-thread_local std::string t_elaboration;
+thread_local ErrorRecord t_record;
 
-Session* Find(ViSession vi) {
-    if (vi < kFirstSession || vi >= kFirstSession + kSlots) return nullptr;
-    return g_sessions[vi - kFirstSession].load(std::memory_order_acquire);
-}
-
-ViStatus NoSessionError(ViStatus status, std::string what) {
-    t_lastStatus = status;
-    t_elaboration = std::move(what);
-    return status;
-}
+// What the Throw fault throws: a type no handler of this project knows.
+struct InjectedThrow {};
 
 ViStatus InvalidSession(ViSession vi, const char* function) {
-    return NoSessionError(IVI_ERROR_INVALID_SESSION_HANDLE, std::string(function) + ": " +
-                                                                std::to_string(vi) +
-                                                                " is not a session of this driver");
+    return CEntry(function, t_record, [&]() -> ViStatus {
+        throw StatusError(IVI_ERROR_INVALID_SESSION_HANDLE,
+                          std::to_string(vi) + " is not a session of this driver");
+    });
 }
 
-ViStatus Fail(Session& s, ViStatus status, std::string what) {
-    s.lastStatus = status;
-    s.elaboration = std::move(what);
-    return status;
-}
-
-// Runs one call on a session: injected faults first, then the body, whose StatusError becomes
+// Runs one call on a session: injected faults first, then the body; whatever it throws becomes
 // the call's status and the session's elaboration.
 template <typename Body>
-ViStatus Run(ViSession vi, const char* function, Body&& body) {
-    Session* s = Find(vi);
+ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
+    Session* s = g_sessions.Find(vi);
     if (s == nullptr) return InvalidSession(vi, function);
-    std::lock_guard lock(s->mutex);
-    Faults& faults = s->instrument.ActiveFaults();
-    if (!faults.Empty())
-        if (const ViStatus injected = faults.Failure(function))
-            return Fail(*s, injected, std::string(function) + ": failure injected by DriverSetup");
-    try {
-        body(s->instrument);
-    } catch (const StatusError& e) {
-        return Fail(*s, e.Status(), std::string(function) + ": " + e.what());
-    } catch (const std::bad_alloc&) {
-        return Fail(*s, IVI_ERROR_OUT_OF_MEMORY, std::string(function) + ": out of memory");
-    }
-    if (!faults.Empty())
-        if (const ViStatus warning = faults.Warning(function)) {
-            s->elaboration = std::string(function) + ": warning injected by DriverSetup";
-            return warning;
+    return CEntry(function, s->record, [&]() -> ViStatus {
+        std::lock_guard lock(s->mutex);
+        Faults& faults = s->instrument.ActiveFaults();
+        if (!faults.Empty()) {
+            if (faults.Throws(function)) throw InjectedThrow{};
+            if (const ViStatus injected = faults.Failure(function))
+                throw StatusError(injected, "failure injected by DriverSetup");
         }
-    return VI_SUCCESS;
+        body(s->instrument);
+        if (!faults.Empty())
+            if (const ViStatus warning = faults.Warning(function)) {
+                s->record.elaboration = std::string(function) + ": warning injected by DriverSetup";
+                return warning;
+            }
+        return VI_SUCCESS;
+    });
 }
 
 template <typename T>
@@ -123,10 +106,10 @@ Faults ParseInitOptions(ViConstString optionString, std::string& driverSetup) {
 ViStatus GetString(ViSession vi, const char* function, ViConstString channel, ViAttr attr,
                    ViInt32 bufferSize, ViChar value[]) {
     ViStatus fits = 0;
-    Session* s = Find(vi);
+    Session* s = g_sessions.Find(vi);
     const ViStatus status = Run(vi, function, [&](Instrument& inst) {
         std::string text = attr == IVI_ATTR_ERROR_ELABORATION
-                               ? s->elaboration
+                               ? s->record.elaboration
                                : inst.GetAttribute<std::string>(attr, channel);
         if (bufferSize > 0 && value == nullptr)
             throw StatusError(IVI_ERROR_NULL_POINTER, "the value buffer is a null pointer");
@@ -143,79 +126,58 @@ ViStatus QZSimFgen_InitWithOptions(ViRsrc resource, ViBoolean idQuery, ViBoolean
                                    ViConstString options, ViSession* vi) {
     (void)idQuery;
     (void)reset; // every session starts from the reset state
-    if (vi == nullptr)
-        return NoSessionError(IVI_ERROR_NULL_POINTER, "InitWithOptions: vi is a null pointer");
-    *vi = 0;
-    try {
+    return CEntry("InitWithOptions", t_record, [&]() -> ViStatus {
+        if (vi == nullptr) throw StatusError(IVI_ERROR_NULL_POINTER, "vi is a null pointer");
+        *vi = 0;
         std::string driverSetup;
         Faults faults = ParseInitOptions(options, driverSetup);
+        if (faults.Throws("InitWithOptions")) throw InjectedThrow{};
         if (const ViStatus injected = faults.Failure("InitWithOptions"))
-            return NoSessionError(injected, "InitWithOptions: failure injected by DriverSetup");
+            throw StatusError(injected, "failure injected by DriverSetup");
         const ViStatus warning = faults.Warning("InitWithOptions");
         auto session = std::make_unique<Session>(
             std::move(faults), resource != nullptr ? resource : "", std::move(driverSetup));
         session->instrument.Reset();
-        std::lock_guard lock(g_openClose);
-        for (size_t slot = 0; slot < kSlots; ++slot)
-            if (g_sessions[slot].load(std::memory_order_relaxed) == nullptr) {
-                g_sessions[slot].store(session.release(), std::memory_order_release);
-                *vi = kFirstSession + static_cast<ViSession>(slot);
-                return warning;
-            }
-        return NoSessionError(IVI_ERROR_TOO_MANY_SESSIONS, "InitWithOptions: all " +
-                                                               std::to_string(kSlots) +
-                                                               " sessions are open");
-    } catch (const StatusError& e) {
-        return NoSessionError(e.Status(), std::string("InitWithOptions: ") + e.what());
-    } catch (const std::bad_alloc&) {
-        return NoSessionError(IVI_ERROR_OUT_OF_MEMORY, "InitWithOptions: out of memory");
-    }
+        *vi = g_sessions.Insert(std::move(session));
+        return warning;
+    });
 }
 
 ViStatus QZSimFgen_close(ViSession vi) {
-    std::unique_ptr<Session> session;
-    {
-        std::lock_guard lock(g_openClose);
-        if (Find(vi) == nullptr) return InvalidSession(vi, "close");
-        session.reset(g_sessions[vi - kFirstSession].exchange(nullptr));
-    }
-    // The session is gone whatever the instrument answers; an injected failure still reports.
-    if (const ViStatus injected = session->instrument.ActiveFaults().Failure("close"))
-        return NoSessionError(injected, "close: failure injected by DriverSetup");
-    return VI_SUCCESS;
+    return CEntry("close", t_record, [&]() -> ViStatus {
+        const std::unique_ptr<Session> session = g_sessions.Remove(vi);
+        if (!session) return InvalidSession(vi, "close");
+        // The session is gone whatever the instrument answers; an injected failure still reports.
+        if (const ViStatus injected = session->instrument.ActiveFaults().Failure("close"))
+            throw StatusError(injected, "failure injected by DriverSetup");
+        return VI_SUCCESS;
+    });
 }
 
 ViStatus QZSimFgen_error_message(ViSession vi, ViStatus status, ViChar message[]) {
     (void)vi;
-    if (message == nullptr) return IVI_ERROR_NULL_POINTER;
-    qzivi::ivi::StatusMessage(status, message);
-    return VI_SUCCESS;
+    return CEntry("error_message", t_record, [&]() -> ViStatus {
+        if (message == nullptr) throw StatusError(IVI_ERROR_NULL_POINTER, "message is null");
+        qzivi::ivi::StatusMessage(status, message);
+        return VI_SUCCESS;
+    });
 }
 
 ViStatus QZSimFgen_GetError(ViSession vi, ViStatus* code, ViInt32 bufferSize,
                             ViChar description[]) {
-    Session* s = Find(vi);
-    std::unique_lock<std::mutex> lock;
-    if (s != nullptr) lock = std::unique_lock(s->mutex);
-    ViStatus& status = s != nullptr ? s->lastStatus : t_lastStatus;
-    std::string& elaboration = s != nullptr ? s->elaboration : t_elaboration;
-    ViChar text[256];
-    qzivi::ivi::StatusMessage(status, text);
-    std::string full = status == 0 ? std::string() : std::string(text) + " " + elaboration;
-    if (code != nullptr) *code = status;
-    const ViInt32 result = CopyText(full, bufferSize, description);
-    if (bufferSize != 0) {
-        status = 0;
-        elaboration.clear();
-    }
-    return result;
+    Session* s = g_sessions.Find(vi);
+    if (s == nullptr) return t_record.Report(code, bufferSize, description);
+    return CEntry("GetError", s->record, [&] {
+        std::lock_guard lock(s->mutex);
+        return s->record.Report(code, bufferSize, description);
+    });
 }
 
 ViStatus QZSimFgen_GetAttributeViInt32(ViSession vi, ViConstString channel, ViAttr attr,
                                        ViInt32* value) {
-    Session* s = Find(vi);
+    Session* s = g_sessions.Find(vi);
     return Run(vi, "GetAttributeViInt32", [&](Instrument& inst) {
-        Out(value, attr == IVI_ATTR_PRIMARY_ERROR ? s->lastStatus
+        Out(value, attr == IVI_ATTR_PRIMARY_ERROR ? s->record.status
                                                   : inst.GetAttribute<ViInt32>(attr, channel));
     });
 }

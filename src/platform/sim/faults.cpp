@@ -92,22 +92,28 @@ std::pair<ViInt32, ViInt32> Version(std::string_view item, std::string_view valu
 
 } // namespace
 
-ViStatus Faults::Failure(std::string_view function) {
-    for (auto& fault : failures)
+namespace {
+// The status of the first fault of `function` that has calls left, counting it down; 0 for none.
+ViStatus Meet(std::vector<FunctionFault>& faults, std::string_view function) {
+    for (auto& fault : faults)
         if (fault.remaining != 0 && fault.function == function) {
             if (fault.remaining > 0) --fault.remaining;
             return fault.status;
         }
     return 0;
 }
+} // namespace
+
+ViStatus Faults::Failure(std::string_view function) {
+    return Meet(failures, function);
+}
 
 ViStatus Faults::Warning(std::string_view function) {
-    for (auto& fault : warnings)
-        if (fault.remaining != 0 && fault.function == function) {
-            if (fault.remaining > 0) --fault.remaining;
-            return fault.status;
-        }
-    return 0;
+    return Meet(warnings, function);
+}
+
+bool Faults::Throws(std::string_view function) {
+    return Meet(throws, function) != 0;
 }
 
 Faults ParseDriverSetup(std::string_view text) {
@@ -121,6 +127,8 @@ Faults ParseDriverSetup(std::string_view text) {
         auto is = [&](std::string_view name) { return ivi::EqualsNoCase(key, name); };
         if (is("Fail")) {
             faults.failures.push_back(Function(item, value, 0));
+        } else if (is("Throw")) {
+            faults.throws.push_back(Function(item, value, IVI_ERROR_CANNOT_RECOVER));
         } else if (is("Warn")) {
             faults.warnings.push_back(Function(item, value, IVI_WARN_VALUE_COERCED));
         } else if (is("Refuse")) {

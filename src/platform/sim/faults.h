@@ -36,6 +36,7 @@ struct RefusedValue {
 struct Faults {
     std::vector<FunctionFault> failures; // the call fails with the status, changing nothing
     std::vector<FunctionFault> warnings; // the call succeeds and returns the status
+    std::vector<FunctionFault> throws;   // the call throws an exception of no known type
     std::vector<RefusedValue> refused;   // any call that would give the attribute this value
     std::optional<ViInt32> classSpecMajor, classSpecMinor, driverMajor, driverMinor;
     std::optional<std::string> prefix;
@@ -44,11 +45,12 @@ struct Faults {
     bool rejectEmptyChannel = false;
     Limits limits;
 
-    bool Empty() const { return failures.empty() && warnings.empty(); }
+    bool Empty() const { return failures.empty() && warnings.empty() && throws.empty(); }
 
     // The failure or warning a call of `function` meets now, counting it down; 0 for none.
     ViStatus Failure(std::string_view function);
     ViStatus Warning(std::string_view function);
+    bool Throws(std::string_view function);
 };
 
 // Parses the DriverSetup text: items "Key=Value" separated by ';'. Throws

@@ -8,6 +8,7 @@
 #include <chrono>
 #include <functional>
 #include <string>
+#include <vector>
 
 namespace qzivi::ivi {
 
@@ -38,6 +39,56 @@ inline bool TraceEnabled() {
 }
 
 void Trace(const TraceRecord& record);
+
+// ---- How a trace line shows a call's arguments ----
+// A channel name as the application gave it.
+struct TraceChannel {
+    ViConstString name;
+};
+// A text the driver writes into the caller's buffer: shown as it came back.
+struct TraceOutText {
+    ViChar* buffer;
+    ViInt32 size;
+};
+// An array the call reads, or (Out) fills: shown by its length and its first and last values.
+template <typename T>
+struct TraceArray {
+    const T* data;
+    ViInt32 count;
+};
+struct TraceOutArray {
+    const ViReal64* data;
+    ViInt32 count;
+};
+
+void AppendArgument(std::string& out, ViInt32 v, ViStatus status);
+void AppendArgument(std::string& out, ViUInt32 v, ViStatus status);
+void AppendArgument(std::string& out, ViBoolean v, ViStatus status);
+void AppendArgument(std::string& out, ViReal64 v, ViStatus status);
+void AppendArgument(std::string& out, ViConstString v, ViStatus status);
+void AppendArgument(std::string& out, TraceChannel v, ViStatus status);
+void AppendArgument(std::string& out, TraceOutText v, ViStatus status);
+void AppendArgument(std::string& out, TraceArray<ViReal64> v, ViStatus status);
+void AppendArgument(std::string& out, TraceArray<ViInt32> v, ViStatus status);
+void AppendArgument(std::string& out, TraceOutArray v, ViStatus status);
+// An output parameter: what the driver gave back, '?' where it gave nothing.
+template <typename T>
+void AppendArgument(std::string& out, T* v, ViStatus status) {
+    if (v == nullptr || status < 0) {
+        out += v == nullptr ? "NULL" : "&?";
+        return;
+    }
+    out += "&";
+    AppendArgument(out, *v, status);
+}
+
+// The arguments of one call as a trace line writes them, separated by ", ".
+template <typename... Args>
+std::string FormatArguments(ViStatus status, const Args&... args) {
+    std::string out;
+    ((out += out.empty() ? "" : ", ", AppendArgument(out, args, status)), ...);
+    return out;
+}
 
 // Collects the records of its lifetime, for tests and tools.
 class TraceRecorder {
