@@ -1,75 +1,18 @@
 // The simulated instrument: its settings, their limits, its memory, and the signal it puts out.
+// The attribute catalogue is in attributes.cpp, ranges and validation in limits.cpp, the driver
+// operations in operations.cpp, the signal in synthesis.cpp.
 #pragma once
 
+#include "attributes.h"
 #include "faults.h"
+#include "synthesis.h"
 
 #include <chrono>
 #include <initializer_list>
-#include <map>
 #include <string>
-#include <variant>
 #include <vector>
 
 namespace qzivi::sim {
-
-enum class Group {
-    Base,
-    StdFunc,
-    ArbWfm,
-    ArbFrequency,
-    ArbSeq,
-    Trigger,
-    InternalTrigger,
-    SoftwareTrigger,
-    Burst,
-    ModulateAM,
-    ModulateFM,
-};
-
-struct FuncSettings {
-    ViInt32 waveform = IVIFGEN_VAL_WFM_SINE;
-    double amplitude = 0.1; // volts peak to peak
-    double offset = 0;
-    double frequency = 1000;
-    double startPhase = 0; // degrees
-    double dutyCycleHigh = 50;
-};
-
-struct ChannelState {
-    bool outputEnabled = false;
-    double impedance = 50;
-    ViInt32 operationMode = IVIFGEN_VAL_OPERATE_CONTINUOUS;
-    FuncSettings func;
-    ViInt32 waveformHandle = 0;
-    ViInt32 sequenceHandle = 0;
-    double arbGain = 1;
-    double arbOffset = 0;
-    double arbFrequency = 1000;
-    bool playsAtArbFrequency = false; // the last of sample rate and arb frequency set wins
-    ViInt32 triggerSource = IVIFGEN_VAL_EXTERNAL;
-    ViInt32 burstCount = 1;
-    bool amEnabled = false;
-    ViInt32 amSource = IVIFGEN_VAL_AM_INTERNAL;
-    bool fmEnabled = false;
-    ViInt32 fmSource = IVIFGEN_VAL_FM_INTERNAL;
-};
-
-struct InternalSource {
-    double amount; // AM depth in percent, FM deviation in hertz
-    ViInt32 waveform;
-    double frequency;
-};
-
-struct GlobalState {
-    ViInt32 outputMode = IVIFGEN_VAL_OUTPUT_FUNC;
-    ViInt32 refClockSource = IVIFGEN_VAL_REF_CLOCK_INTERNAL;
-    double sampleRate = 1e6;
-    double internalTriggerRate = 1000;
-    InternalSource am{50, IVIFGEN_VAL_WFM_SINE, 100};
-    InternalSource fm{100, IVIFGEN_VAL_WFM_SINE, 10};
-};
-
-using AttrValue = std::variant<ViInt32, ViReal64, ViBoolean, ViSession, std::string>;
 
 struct Range {
     double min;
@@ -84,6 +27,11 @@ public:
 
     void Reset();
     Faults& ActiveFaults() { return faults_; }
+    const Faults& ActiveFaults() const { return faults_; }
+    const std::string& Resource() const { return resource_; }
+    const std::string& DriverSetup() const { return driverSetup_; }
+    // The capability groups offered, comma-separated.
+    std::string Capabilities() const;
 
     void ConfigureOutputMode(ViInt32 mode);
     void ConfigureRefClockSource(ViInt32 source);
@@ -134,15 +82,12 @@ public:
 
     // Refuses a call of a function whose group the instrument does not offer.
     void RequireGroup(Group group, const char* function) const;
+    bool Offers(Group group) const;
 
 private:
-    struct Sequence {
-        std::vector<ViInt32> handles;
-        std::vector<ViInt32> loopCounts;
-    };
-
     int ChannelIndex(const char* channel) const;
-    bool Offers(Group group) const;
+    // The row of an attribute this instrument answers, checked against the caller's type.
+    const AttrInfo& Row(ViAttr attr, Kind callersKind) const;
     AttrValue Get(ViAttr attr, const char* channel, const AttrValue& type) const;
     // Every change goes through here: checks the whole state it would leave, then keeps it.
     void Commit(const GlobalState& global, int channel, const ChannelState& state, bool checkOnly);
@@ -155,19 +100,19 @@ private:
         double value;
     };
     void CheckRefusals(std::initializer_list<Touch> touches) const;
-    Range RangeOf(ViAttr attr, const GlobalState& global, const ChannelState& state) const;
+    Range RangeOf(ViAttr attr, const ChannelState& state) const;
     double ElapsedSeconds() const;
-    double Sample(const ChannelState& state, double t, const std::vector<double>& triggers) const;
-    double Carrier(const ChannelState& state, double tau, double* period) const;
-    std::vector<double> AcceptedTriggers(const ChannelState& state) const;
+    OutputState Output(int channel) const {
+        return {global_, channels_[channel], waveforms_, sequences_, generating_};
+    }
 
     Faults faults_;
     std::string resource_;
     std::string driverSetup_;
     GlobalState global_;
     ChannelState channels_[kChannels];
-    std::map<ViInt32, std::vector<double>> waveforms_;
-    std::map<ViInt32, Sequence> sequences_;
+    WaveformMemory waveforms_;
+    SequenceMemory sequences_;
     long long usedPoints_ = 0;
     ViInt32 nextWaveform_ = 10001;
     ViInt32 nextSequence_ = 5000001;
