@@ -34,23 +34,23 @@ std::string TrimAtNull(const char* buffer, std::size_t size) {
 }
 
 void CIviSaveErrorInfo::SaveInfo(std::int32_t number, std::string source, std::string description) {
-    number_ = number;
-    source_ = std::move(source);
-    description_ = std::move(description);
-    saved_ = true;
+    m_lNumber = number;
+    m_sSource = std::move(source);
+    m_sDescription = std::move(description);
+    m_bSaved = true;
 }
 
 void CIviSaveErrorInfo::Throw() {
-    if (!saved_) return;
-    saved_ = false;
-    throw Failure(number_, source_, description_);
+    if (!m_bSaved) return;
+    m_bSaved = false;
+    throw Failure(m_lNumber, m_sSource, m_sDescription);
 }
 
 CIviErrorReport::CIviErrorReport() {
     try {
-        SessionMgr_ = SessionManager::Create();
+        m_oSessionMgr = SessionManager::Create();
     } catch (...) {
-        SessionMgr_ = nullptr; // a missing or broken library means direct mode
+        m_oSessionMgr = nullptr; // a missing or broken library means direct mode
     }
 }
 
@@ -59,45 +59,45 @@ CIviErrorReport::~CIviErrorReport() = default;
 // ---- Session and state --------------------------------------------------------------------------
 
 void CIviErrorReport::state(std::int32_t newState) {
-    StateChanged(newState, state_);
-    state_ = newState;
+    StateChanged(newState, m_lState);
+    m_lState = newState;
 }
 
 std::int32_t CIviErrorReport::CheckForValidState(std::int32_t forbidden, const std::string& source,
                                                  bool setBusy) {
-    if ((forbidden & state_) != 0) {
-        if (state_ & IviStateClosed) DoStdError(errid::kNotInitialized, source);
-        if (state_ & IviStateInitialized) DoStdError(errid::kNotConfigured, source);
+    if ((forbidden & m_lState) != 0) {
+        if (m_lState & IviStateClosed) DoStdError(errid::kNotInitialized, source);
+        if (m_lState & IviStateInitialized) DoStdError(errid::kNotConfigured, source);
         DoStdError(errid::kOperationInProgress, source);
     }
-    const std::int32_t present = state_;
+    const std::int32_t present = m_lState;
     if (setBusy) state(IviStateBusy);
     return present;
 }
 
 std::int32_t CIviErrorReport::CheckForValidState(std::int32_t forbidden, std::string_view path,
                                                  std::string_view word, bool setBusy) {
-    if ((forbidden & state_) != 0)
+    if ((forbidden & m_lState) != 0)
         return CheckForValidState(forbidden, std::string(path).append(word), setBusy);
-    const std::int32_t present = state_;
+    const std::int32_t present = m_lState;
     if (setBusy) state(IviStateBusy);
     return present;
 }
 
 ViSession CIviErrorReport::hSession() const {
-    if (IviSession_)
-        return static_cast<ViSession>(SessionMgrCall([&] { return IviSession_->Handle(1); }));
-    return sessionNumber_;
+    if (m_oIviSession)
+        return static_cast<ViSession>(SessionMgrCall([&] { return m_oIviSession->Handle(1); }));
+    return m_lSessionNumber;
 }
 
 void CIviErrorReport::hSession(ViSession session) {
-    if (!IviSession_) sessionNumber_ = session;
+    if (!m_oIviSession) m_lSessionNumber = session;
 }
 
 bool CIviErrorReport::IsInitialized() const {
-    if (!UsingSessionMgr()) return sessionNumber_ != 0;
-    if (!IviSession_) return false;
-    return SessionMgrCall([&] { return IviSession_->IsOpen(); });
+    if (!UsingSessionMgr()) return m_lSessionNumber != 0;
+    if (!m_oIviSession) return false;
+    return SessionMgrCall([&] { return m_oIviSession->IsOpen(); });
 }
 
 std::string CIviErrorReport::BuildOptionString(bool doReset, bool doIDQuery,
@@ -111,8 +111,8 @@ std::string CIviErrorReport::BuildOptionString(bool doReset, bool doIDQuery,
 void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
                            const std::string& optionString, std::int32_t reInitBehavior) {
     try {
-        if (name.empty()) name = lastLogicalName_;
-        if (name != lastLogicalName_) reInitBehavior = qziviCloseAndInit;
+        if (name.empty()) name = m_sLastLogicalName;
+        if (name != m_sLastLogicalName) reInitBehavior = qziviCloseAndInit;
         if (IsInitialized()) {
             if (reInitBehavior == qziviNoOp) return;
             if (reInitBehavior == qziviCloseAndInit)
@@ -123,11 +123,11 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
         CheckForValidState(IviStateBusy, "Init", true);
         if (UsingSessionMgr()) {
             InSessionMgrCall = true;
-            IviSession_ = SessionMgr_->GetSession("IVI::IVIFGEN::" + name, 0);
-            IviSession_->Open(BuildOptionString(doReset, doIDQuery, optionString));
+            m_oIviSession = m_oSessionMgr->GetSession("IVI::IVIFGEN::" + name, 0);
+            m_oIviSession->Open(BuildOptionString(doReset, doIDQuery, optionString));
             InSessionMgrCall = false;
             state(IviStateInitialized);
-            lastLogicalName_ = name;
+            m_sLastLogicalName = name;
         } else {
             ViSession session = 0;
             const ViStatus status =
@@ -136,13 +136,13 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
             IviCheckError(status, "Init", 0, "");
             hSession(session);
             state(IviStateInitialized);
-            lastLogicalName_ = name;
+            m_sLastLogicalName = name;
         }
         if (!IsSpecVersionOk()) DoStdError(errid::kClassSpecVersion, "Init");
         Initialized();
     } catch (...) {
         const PendingFailure failure = CurrentFailure();
-        savedError_.SaveInfo(failure.number, failure.source, failure.description);
+        m_oSavedError.SaveInfo(failure.number, failure.source, failure.description);
         try {
             CloseSession(false);
         } catch (...) {
@@ -151,8 +151,8 @@ void CIviErrorReport::Init(std::string& name, bool doIDQuery, bool doReset,
             state(IviStateClosed);
         } catch (...) {
         }
-        IviSession_.reset();
-        savedError_.Throw();
+        m_oIviSession.reset();
+        m_oSavedError.Throw();
     }
 }
 
@@ -160,10 +160,10 @@ void CIviErrorReport::CloseSession(bool raiseAgain) {
     try {
         CheckForValidState(IviStateClosed | IviStateBusy, "CloseSession", true);
         if (UsingSessionMgr()) {
-            IviSession_.reset();
+            m_oIviSession.reset();
         } else {
-            const ViStatus status = IviFgen_close(sessionNumber_);
-            sessionNumber_ = 0;
+            const ViStatus status = IviFgen_close(m_lSessionNumber);
+            m_lSessionNumber = 0;
             IviCheckError(status, "CloseSession", 0, "");
         }
         state(IviStateClosed);
@@ -173,7 +173,7 @@ void CIviErrorReport::CloseSession(bool raiseAgain) {
             state(IviStateClosed);
         } catch (...) {
         }
-        IviSession_.reset();
+        m_oIviSession.reset();
         if (raiseAgain) ReRaise();
     }
 }
@@ -284,10 +284,10 @@ std::string CIviErrorReport::BuildIviDescription(ViStatus status, std::string_vi
 ViStatus CIviErrorReport::ReportStatus(ViStatus status, std::string_view sourceGiven,
                                        std::int32_t flags, std::string_view extra) {
     const std::int32_t code = MapIviError(status);
-    lastIviError_ = code;
+    m_lLastIviError = code;
     if (code == status) return status;
-    if (!sourceGiven.empty()) lastSource_ = sourceGiven;
-    const std::string source = lastSource_;
+    if (!sourceGiven.empty()) m_sLastSource = sourceGiven;
+    const std::string source = m_sLastSource;
     const std::string description = BuildIviDescription(status, extra);
     if (flags & 8) return status;
     if (status > 0) {
@@ -301,9 +301,9 @@ void CIviErrorReport::RaiseErrorEvents(std::int32_t code, const std::string& sou
                                        const std::string& description) {
     AllError(code, source, description);
     Error(code, source, description);
-    LastErrorNumber_ = code;
-    LastErrorSource_ = source;
-    LastErrorDescription_ = description;
+    m_lLastErrorNumber = code;
+    m_sLastErrorSource = source;
+    m_sLastErrorDescription = description;
 }
 
 void CIviErrorReport::DoStdError(std::int32_t code, const std::string& source, ViStatus iviStatus,

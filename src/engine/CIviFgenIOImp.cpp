@@ -6,6 +6,7 @@
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/support/failure.h"
 
+#include <algorithm>
 #include <cstring>
 #include <stdexcept>
 
@@ -453,6 +454,16 @@ void CIviFgenIOImp::Abort(bool internalCall) {
 
 void CIviFgenIOImp::SendSoftwareTrigger() {
     Generation(false, ~IviStateConfigured, "SendSoftwareTrigger", &IviFgen_SendSoftwareTrigger);
+}
+
+std::vector<double> CIviFgenIOImp::RenderOutput(const std::string& channel, double startTime,
+                                                double timeStep, std::int32_t count) {
+    m_oErr->CheckForValidState(IviStateClosed, Path(), "RenderOutput", false);
+    std::vector<double> volts(static_cast<std::size_t>(std::max(count, 0)));
+    const ViStatus status =
+        QZIvi_RenderOutput(Vi(), channel.c_str(), startTime, timeStep, count, volts.data());
+    m_oErr->IviCheckError(status, status == 0 ? std::string() : Path() + "RenderOutput", 0, "");
+    return volts;
 }
 
 // ---- Capability queries -------------------------------------------------------------------------

@@ -251,16 +251,7 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
         // A body that ends in the delimiter has one more, empty, token after it: it converts to
         // nothing and is the last of its block, so it is left out.
         const char* tokensEnd = last != nullptr ? bodyEnd - 1 : bodyEnd;
-        ForEachToken(text + skip, tokensEnd, delimiter,
-                     [&](std::int64_t index, const char* a, const char* b) {
-                         if (result.size() >= limit) return false;
-                         if (index == wanted) {
-                             double value = 0;
-                             if (ParseToken(a, b, value)) result.push_back(value);
-                             wanted += interval;
-                         }
-                         return true;
-                     });
+        TakeTokens(text + skip, tokensEnd, delimiter, wanted, interval, limit, result);
         first = false;
         skip = 0;
         // Once the points are all taken the rest of the file cannot change the result.

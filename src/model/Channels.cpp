@@ -154,7 +154,7 @@ std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Item(const Variant& Index) 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& ChannelName) {
     return Guard(m_oErr, "Add", [&] {
         auto channel = NewItem(ChannelName);
-        items_.Append(channel);
+        m_oItems.Append(channel);
         if (const auto propSet = PropSet()) {
             ActiveChannel(channel);
             propSet->RaiseCollectionChanged(kChannels, Variant::Object(shared_from_this()),
@@ -166,7 +166,7 @@ std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::Add(const std::string& Chan
 
 void QZIviFgenChannels::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
-        const std::int32_t position = items_.RemovalPosition(Index);
+        const std::int32_t position = m_oItems.RemovalPosition(Index);
         if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
         const auto active = ActiveChannel();
         if (active && (IndexOfObject(active.get()) == position ||
@@ -174,11 +174,11 @@ void QZIviFgenChannels::Remove(const Variant& Index) {
             if (Count() == 1)
                 ActiveChannel(nullptr);
             else if (position - 1 > 0)
-                ActiveChannel(items_.At(position - 1));
+                ActiveChannel(m_oItems.At(position - 1));
             else
-                ActiveChannel(items_.At(position + 1));
+                ActiveChannel(m_oItems.At(position + 1));
         }
-        items_.RemoveAt(position);
+        m_oItems.RemoveAt(position);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kChannels, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
@@ -186,7 +186,7 @@ void QZIviFgenChannels::Remove(const Variant& Index) {
 }
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::ActiveChannel() {
-    if (!m_oActiveChannel && Count() > 0) m_oActiveChannel = items_.At(1);
+    if (!m_oActiveChannel && Count() > 0) m_oActiveChannel = m_oItems.At(1);
     return m_oActiveChannel;
 }
 

@@ -1,6 +1,12 @@
 #include "qzivi/model/ModelSupport.h"
 
+#include "qzivi/model/CIviFgenPropImp.h"
+
 namespace qzivi {
+
+std::string PathOf(const CIviFgenPropImp* propSet) {
+    return propSet ? propSet->Path() : std::string();
+}
 
 void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key) {
     // An item with every value at its default stores nothing, so a count may exceed the values,

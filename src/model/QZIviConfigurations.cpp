@@ -96,13 +96,13 @@ void QZIviConfigurations::Attach(std::shared_ptr<CIviErrorReport> errorReport,
     m_oErr = std::move(errorReport);
     m_oSourceSet = sourceSet;
     if (!identifier.empty()) m_sFileIdentifier = identifier;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->Attach(m_oErr, this, m_sFileIdentifier);
 }
 
 void QZIviConfigurations::SetPath(const std::string& parentPath) {
     m_sPath = JoinPath(parentPath, "Configurations");
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->SetPath(m_sPath);
 }
 
@@ -111,13 +111,13 @@ std::shared_ptr<QZIviConfiguration> QZIviConfigurations::Find(const Variant& ind
         try {
             const std::int32_t position = index.AsInt32();
             if (position >= 1 && position <= Count())
-                return items_[static_cast<std::size_t>(position - 1)];
+                return m_oItems[static_cast<std::size_t>(position - 1)];
         } catch (...) {
         }
         return nullptr;
     }
     const std::string name = index.IsEmpty() || index.IsMissing() ? std::string() : index.AsText();
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         if (item->Name() == name) return item;
     return nullptr;
 }
@@ -144,7 +144,7 @@ std::shared_ptr<QZIviConfiguration> QZIviConfigurations::Add(const std::string& 
         }
         item->SetName(Name);
         item->SetPath(m_sPath);
-        items_.push_back(item);
+        m_oItems.push_back(item);
         return item;
     });
 }
@@ -159,7 +159,7 @@ void QZIviConfigurations::Remove(const Variant& Index) {
         }
         if (position < 1 || position > Count())
             StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
-        items_.erase(items_.begin() + (position - 1));
+        m_oItems.erase(m_oItems.begin() + (position - 1));
     });
 }
 
@@ -187,13 +187,13 @@ void QZIviConfigurations::StoreConfiguration(const Variant& index) {
 
 std::int32_t QZIviConfigurations::IndexOfObject(const QZIviConfiguration* object) const {
     for (std::int32_t i = 1; i <= Count(); ++i)
-        if (items_[static_cast<std::size_t>(i - 1)].get() == object) return i;
+        if (m_oItems[static_cast<std::size_t>(i - 1)].get() == object) return i;
     return -1;
 }
 
 std::int32_t QZIviConfigurations::IndexOfName(const std::string& name) const {
     for (std::int32_t i = 1; i <= Count(); ++i)
-        if (items_[static_cast<std::size_t>(i - 1)]->Name() == name) return i;
+        if (m_oItems[static_cast<std::size_t>(i - 1)]->Name() == name) return i;
     return -1;
 }
 
@@ -205,24 +205,24 @@ void QZIviConfigurations::ReadProperties(const PropertyBag& bag) {
         item->Attach(m_oErr, this, m_sFileIdentifier);
         item->ReadProperties(bag, ItemPrefix(i));
         item->SetPath(m_sPath);
-        items_.push_back(std::move(item));
+        m_oItems.push_back(std::move(item));
     }
 }
 
 void QZIviConfigurations::WriteProperties(PropertyBag& bag) const {
     bag.WriteInt32(kCount, Count(), 0);
     std::int32_t i = 0;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->WriteProperties(bag, ItemPrefix(++i));
 }
 
 void QZIviConfigurations::Clone(QZIviConfigurations& target) const {
-    for (const auto& item : items_) {
+    for (const auto& item : m_oItems) {
         const auto copy = std::make_shared<QZIviConfiguration>();
         copy->Attach(target.m_oErr, &target, target.m_sFileIdentifier);
         item->Clone(*copy);
         copy->SetPath(target.m_sPath);
-        target.items_.push_back(copy);
+        target.m_oItems.push_back(copy);
     }
 }
 

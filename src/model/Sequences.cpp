@@ -125,7 +125,7 @@ QZIviFgenSequence::Add(const std::shared_ptr<QZIviFgenArbWaveform>& Waveform,
         // The setter's own frame reports a foreign waveform; it ends this Add only if it raises.
         item->Waveform(Waveform);
         item->Iterations(Iterations);
-        items_.push_back(item);
+        m_oItems.push_back(item);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
                                             ChangeAdded, Count(), "");
@@ -138,7 +138,7 @@ void QZIviFgenSequence::Remove(const Variant& Index) {
         const std::int32_t position = Index.IsNumeric() ? Index.AsInt32() : 0;
         if (position < 1 || position > Count())
             StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
-        items_.erase(items_.begin() + (position - 1));
+        m_oItems.erase(m_oItems.begin() + (position - 1));
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
@@ -158,7 +158,7 @@ std::int32_t QZIviFgenSequence::DataSize() {
         m_oErr, "DataSize",
         [&] {
             std::int64_t total = 0;
-            for (const auto& item : items_) {
+            for (const auto& item : m_oItems) {
                 if (!item->Waveform() || item->Iterations() < 1)
                     StdError(m_oErr, errid::kInvalidSequence, m_sPath + "DataSize");
                 total +=
@@ -172,7 +172,7 @@ std::int32_t QZIviFgenSequence::DataSize() {
 
 std::int32_t QZIviFgenSequence::PreviewDataSize() {
     std::int64_t total = 0;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         if (item->Waveform()) total += item->Waveform()->DataSize();
     return static_cast<std::int32_t>(std::min<std::int64_t>(total, 0x7FFFFFFF));
 }
@@ -255,14 +255,14 @@ SampleBlocks QZIviFgenSequence::GetDataSample(std::int32_t StartIndex, std::int3
 
 std::vector<std::int32_t> QZIviFgenSequence::WaveformHandles() const {
     std::vector<std::int32_t> handles;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         handles.push_back(item->Waveform() ? item->Waveform()->WaveformHandle() : 0);
     return handles;
 }
 
 std::vector<std::int32_t> QZIviFgenSequence::IterationCounts() const {
     std::vector<std::int32_t> counts;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         counts.push_back(item->Iterations());
     return counts;
 }
@@ -271,18 +271,18 @@ void QZIviFgenSequence::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                                const std::shared_ptr<CIviFgenPropImp>& propSet) {
     m_oErr = std::move(errorReport);
     m_oPropSet = propSet;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->Attach(m_oErr, propSet);
 }
 
 void QZIviFgenSequence::SetPath(const std::string& parentPath) {
     m_sPath = JoinPath(parentPath, "Sequence");
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->SetPath(m_sPath);
 }
 
 void QZIviFgenSequence::InitProperties() {
-    items_.clear();
+    m_oItems.clear();
     Name("");
     m_lSequenceHandle = 0;
     m_sUniqueId = NewUniqueId();
@@ -297,12 +297,12 @@ void QZIviFgenSequence::ReadProperties(const PropertyBag& bag, const std::string
     const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
     if (count <= 0) return;
     CheckItemCount(count, bag.Size(), p + "ItemCount");
-    items_.clear();
+    m_oItems.clear();
     for (std::int32_t i = 1; i <= count; ++i) {
         auto item = std::make_shared<QZIviFgenSequenceItem>();
         item->Attach(m_oErr, PropSet());
         item->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-        items_.push_back(std::move(item));
+        m_oItems.push_back(std::move(item));
     }
 }
 
@@ -311,7 +311,7 @@ void QZIviFgenSequence::WriteProperties(PropertyBag& bag, const std::string& pre
     bag.WriteText(p + "Name", m_sName, "");
     bag.WriteInt32(p + "ItemCount", Count(), 0);
     std::int32_t i = 0;
-    for (const auto& item : items_)
+    for (const auto& item : m_oItems)
         item->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
 }
 
@@ -335,7 +335,7 @@ std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Item(const Variant& Index
 std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& SequenceName) {
     return Guard(m_oErr, "Add", [&] {
         auto sequence = NewItem(SequenceName);
-        items_.Append(sequence);
+        m_oItems.Append(sequence);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),
                                             ChangeAdded, Count(), "");
@@ -345,21 +345,13 @@ std::shared_ptr<QZIviFgenSequence> QZIviFgenSequences::Add(const std::string& Se
 
 void QZIviFgenSequences::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
-        const std::int32_t position = items_.RemovalPosition(Index);
+        const std::int32_t position = m_oItems.RemovalPosition(Index);
         if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
-        Queue(items_.At(position)->SequenceHandle());
-        items_.RemoveAt(position);
+        Queue(m_oItems.At(position)->SequenceHandle());
+        m_oItems.RemoveAt(position);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
-    });
-}
-
-std::int32_t QZIviFgenSequences::Limit(const char* operation, ViAttr attribute) {
-    return Guard(m_oErr, operation, [&] {
-        const auto propSet = PropSet();
-        return ReadInstrumentLimit(*m_oErr, (propSet ? propSet->Path() : std::string()) + operation,
-                                   attribute);
     });
 }
 

@@ -247,7 +247,7 @@ std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::stri
         waveform->Filename(Filename);
         if (!AutoNormalizeMode.IsMissing())
             waveform->AutoNormalizeMode(AutoNormalizeMode.AsInt32());
-        items_.Append(waveform);
+        m_oItems.Append(waveform);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kCollection, Variant::Object(shared_from_this()),
                                             ChangeAdded, Count(), "");
@@ -257,9 +257,9 @@ std::shared_ptr<QZIviFgenArbWaveform> QZIviFgenArbWaveforms::Add(const std::stri
 
 void QZIviFgenArbWaveforms::Remove(const Variant& Index) {
     Guard(m_oErr, "Remove", [&] {
-        const std::int32_t position = items_.RemovalPosition(Index);
+        const std::int32_t position = m_oItems.RemovalPosition(Index);
         if (position == 0) StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
-        const auto waveform = items_.At(position);
+        const auto waveform = m_oItems.At(position);
         Queue(waveform->WaveformHandle());
         const auto propSet = PropSet();
         if (propSet && propSet->Sequences() && propSet->Sequences()->Count() > 0) {
@@ -275,18 +275,10 @@ void QZIviFgenArbWaveforms::Remove(const Variant& Index) {
                 }
             }
         }
-        items_.RemoveAt(position);
+        m_oItems.RemoveAt(position);
         if (propSet)
             propSet->RaiseCollectionChanged(kCollection, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
-    });
-}
-
-std::int32_t QZIviFgenArbWaveforms::Limit(const char* operation, ViAttr attribute) {
-    return Guard(m_oErr, operation, [&] {
-        const auto propSet = PropSet();
-        return ReadInstrumentLimit(*m_oErr, (propSet ? propSet->Path() : std::string()) + operation,
-                                   attribute);
     });
 }
 

@@ -211,9 +211,11 @@ TEST_F(ErrorPathTest, AFailingHandlerSendsTheBoundaryToItsFallback) {
 
 TEST_F(ErrorPathTest, ModeOneShowsOneMessageBoxAndRaisesNothing) {
     std::vector<MessageBoxRequest> boxes;
-    auto previous = SetMessageBoxHandler([&](const MessageBoxRequest& r) { boxes.push_back(r); });
-    const auto raised = Boundary("PChannels", 1, [&] { err_->DoStdError(-31624, "Item"); });
-    SetMessageBoxHandler(previous);
+    std::optional<Failure> raised;
+    {
+        const MessageBoxScope scope([&](const MessageBoxRequest& r) { boxes.push_back(r); });
+        raised = Boundary("PChannels", 1, [&] { err_->DoStdError(-31624, "Item"); });
+    }
     EXPECT_FALSE(raised);
     ASSERT_EQ(boxes.size(), 1u);
     EXPECT_EQ(boxes[0].title, "PChannels");

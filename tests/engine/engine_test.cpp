@@ -287,6 +287,23 @@ TEST_F(EngineTest, ACallFromAnEventHandlerDuringARunIsRefused) {
     EXPECT_EQ(configured_, 1);
 }
 
+// The engine renders the output for programs and panels, so none of them holds a raw session.
+TEST_F(EngineTest, RenderOutputNeedsASessionAndGivesTheDriversSamples) {
+    auto& engine = fgen_->Engine();
+    EXPECT_THROW(engine.RenderOutput("Channel1", 0, 1e-4, 4), Failure);
+    fgen_->Channels()->Add("Channel1")->FuncWaveform(qzivifgenWaveformDC);
+    fgen_->Channels()->Item(1)->FuncDCOffset(1.5);
+    fgen_->Configure();
+    EXPECT_EQ(engine.RenderOutput("Channel1", 0, 1e-4, 4), Render("Channel1", 0, 1e-4, 4));
+    EXPECT_EQ(engine.RenderOutput("Channel1", 0, 1e-4, 2), (std::vector<double>{1.5, 1.5}));
+    try {
+        engine.RenderOutput("Channel7", 0, 1e-4, 2);
+        ADD_FAILURE() << "an unknown channel renders nothing";
+    } catch (const Failure& f) {
+        EXPECT_EQ(f.Source(), ".RenderOutput");
+    }
+}
+
 TEST_F(EngineTest, GenerationControlNeedsAConfiguredSession) {
     fgen_->Channels()->Add();
     EXPECT_EQ(Raised([&] { fgen_->Initiate(); }), -31600);

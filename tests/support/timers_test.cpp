@@ -10,10 +10,8 @@ namespace {
 
 class TimerTest : public ::testing::Test {
 protected:
-    TimerTest() { previous_ = SetTickSource(&loop_); }
-    ~TimerTest() override { SetTickSource(previous_); }
     TimerLoop loop_;
-    ITickSource* previous_ = nullptr;
+    TickSourceScope source_{&loop_};
 };
 
 TEST_F(TimerTest, PeriodicTicksStartWhenBothIntervalAndEnabledAreSet) {
@@ -101,7 +99,7 @@ public:
 
 TEST(Timers, NoTimerLeftIsAFailureAndChangesNothingElse) {
     EmptySource empty;
-    ITickSource* previous = SetTickSource(&empty);
+    const TickSourceScope scope(&empty);
     auto timer = CTimer::Create();
     try {
         timer->OneShot(5);
@@ -111,7 +109,24 @@ TEST(Timers, NoTimerLeftIsAFailureAndChangesNothingElse) {
         EXPECT_EQ(f.Description(), "No timers available");
     }
     EXPECT_EQ(timer->TimerID(), 0u);
-    SetTickSource(previous);
+}
+
+// Scopes put back what they replaced, innermost first, even when a scope is left by a failure.
+TEST(Timers, TickSourceScopesRestoreInOrder) {
+    ITickSource& outside = TickSource();
+    TimerLoop a, b;
+    {
+        const TickSourceScope first(&a);
+        EXPECT_EQ(&TickSource(), &a);
+        try {
+            const TickSourceScope second(&b);
+            EXPECT_EQ(&TickSource(), &b);
+            RaiseRuntime(5, "left by a failure");
+        } catch (const Failure&) {
+        }
+        EXPECT_EQ(&TickSource(), &a);
+    }
+    EXPECT_EQ(&TickSource(), &outside);
 }
 
 } // namespace

@@ -36,10 +36,10 @@ public:
     void Throw();
 
 private:
-    std::int32_t number_ = 0;
-    std::string source_;
-    std::string description_;
-    bool saved_ = false;
+    std::int32_t m_lNumber = 0;
+    std::string m_sSource;
+    std::string m_sDescription;
+    bool m_bSaved = false;
 };
 
 class CIviErrorReport {
@@ -55,7 +55,7 @@ public:
               std::int32_t reInitBehavior);
     void CloseSession(bool raiseAgain);
 
-    std::int32_t state() const { return state_; }
+    std::int32_t state() const { return m_lState; }
     void state(std::int32_t newState); // fires StateChanged(new, old) first
 
     // Refuses, through DoStdError, a call whose forbidden mask meets the present state;
@@ -69,10 +69,10 @@ public:
     ViSession hSession() const;
     void hSession(ViSession session);
     bool IsInitialized() const;
-    bool UsingSessionMgr() const { return SessionMgr_ != nullptr; }
-    const std::shared_ptr<SessionManager>& SessionMgr() const { return SessionMgr_; }
-    const std::shared_ptr<SessionObject>& IviSession() const { return IviSession_; }
-    void IviSession(std::shared_ptr<SessionObject> session) { IviSession_ = std::move(session); }
+    bool UsingSessionMgr() const { return m_oSessionMgr != nullptr; }
+    const std::shared_ptr<SessionManager>& SessionMgr() const { return m_oSessionMgr; }
+    const std::shared_ptr<SessionObject>& IviSession() const { return m_oIviSession; }
+    void IviSession(std::shared_ptr<SessionObject> session) { m_oIviSession = std::move(session); }
 
     static std::string BuildOptionString(bool doReset, bool doIDQuery,
                                          const std::string& optionString);
@@ -89,23 +89,23 @@ public:
     ViStatus IviCheckError(ViStatus status, std::string_view source, std::int32_t flags,
                            std::string_view extra) {
         if (status == 0) { // the common case, kept inline: it runs after every driver call
-            lastIviError_ = 0;
+            m_lLastIviError = 0;
             return status;
         }
         return ReportStatus(status, source, flags, extra);
     }
-    std::int32_t GetLastIviError() const { return lastIviError_; }
+    std::int32_t GetLastIviError() const { return m_lLastIviError; }
     void RaiseErrorEvents(std::int32_t code, const std::string& source,
                           const std::string& description);
     [[noreturn]] void DoStdError(std::int32_t code, const std::string& source,
                                  ViStatus iviStatus = 0, const std::string& extra = {});
     std::string BuildIviDescription(ViStatus status, std::string_view extra) const;
 
-    bool ExceptionOnError() const { return exceptionOnError_; }
-    void ExceptionOnError(bool value) { exceptionOnError_ = value; }
-    std::int32_t LastErrorNumber() const { return LastErrorNumber_; }
-    const std::string& LastErrorDescription() const { return LastErrorDescription_; }
-    const std::string& LastErrorSource() const { return LastErrorSource_; }
+    bool ExceptionOnError() const { return m_bExceptionOnError; }
+    void ExceptionOnError(bool value) { m_bExceptionOnError = value; }
+    std::int32_t LastErrorNumber() const { return m_lLastErrorNumber; }
+    const std::string& LastErrorDescription() const { return m_sLastErrorDescription; }
+    const std::string& LastErrorSource() const { return m_sLastErrorSource; }
 
     // Events, in the order the system lists them.
     Event<std::int32_t, const std::string&, const std::string&> Error;
@@ -119,19 +119,19 @@ private:
     ViStatus ReportStatus(ViStatus status, std::string_view source, std::int32_t flags,
                           std::string_view extra);
 
-    std::int32_t state_ = IviStateClosed;
-    ViSession sessionNumber_ = 0;
-    std::shared_ptr<SessionManager> SessionMgr_;
-    std::shared_ptr<SessionObject> IviSession_;
-    std::string lastLogicalName_;
-    CIviSaveErrorInfo savedError_;
+    std::int32_t m_lState = IviStateClosed;
+    ViSession m_lSessionNumber = 0;
+    std::shared_ptr<SessionManager> m_oSessionMgr;
+    std::shared_ptr<SessionObject> m_oIviSession;
+    std::string m_sLastLogicalName;
+    CIviSaveErrorInfo m_oSavedError;
 
-    bool exceptionOnError_ = true; // the control's default, so a set read before any put agrees
-    std::int32_t LastErrorNumber_ = 0;
-    std::string LastErrorDescription_;
-    std::string LastErrorSource_;
-    std::int32_t lastIviError_ = 0;
-    std::string lastSource_;
+    bool m_bExceptionOnError = true; // the control's default, so a set read before any put agrees
+    std::int32_t m_lLastErrorNumber = 0;
+    std::string m_sLastErrorDescription;
+    std::string m_sLastErrorSource;
+    std::int32_t m_lLastIviError = 0;
+    std::string m_sLastSource;
 };
 
 std::string TrimAtNull(const char* buffer, std::size_t size);

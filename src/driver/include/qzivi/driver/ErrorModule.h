@@ -1,6 +1,8 @@
 // The boundary of every public member: how a failure is numbered, reported and passed on.
 #pragma once
 
+#include "qzivi/support/scoped_hook.h"
+
 #include <cstdint>
 #include <functional>
 #include <string>
@@ -53,6 +55,8 @@ struct MessageBoxRequest {
     std::int32_t helpContext = 0;
 };
 using MessageBoxHandler = std::function<void(const MessageBoxRequest&)>;
+// Returns the handler it replaces; MessageBoxScope puts it back at the end of a scope.
 MessageBoxHandler SetMessageBoxHandler(MessageBoxHandler handler);
+using MessageBoxScope = ScopedHook<MessageBoxHandler, &SetMessageBoxHandler>;
 
 } // namespace qzivi

@@ -60,6 +60,12 @@ public:
     // The value; a negative status raises with Path + "GetAttribute".
     Variant GetAttributeVi(AttrType type, ViAttr id, const std::string& channel);
 
+    // What the instrument's output carries: `count` samples in volts from `startTime` seconds after
+    // generation started, `timeStep` apart. Needs an open session and a driver that renders (the
+    // simulator does); anything else raises with Path + "RenderOutput".
+    std::vector<double> RenderOutput(const std::string& channel, double startTime, double timeStep,
+                                     std::int32_t count);
+
     Event<> Configured;
     Event<std::int32_t, const std::string&, const std::string&> Error;
 

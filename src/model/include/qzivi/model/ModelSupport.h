@@ -45,20 +45,20 @@ class ItemList {
 public:
     using Items = std::vector<std::shared_ptr<T>>;
 
-    std::int32_t Count() const { return static_cast<std::int32_t>(items_.size()); }
+    std::int32_t Count() const { return static_cast<std::int32_t>(m_oItems.size()); }
     const std::shared_ptr<T>& At(std::int32_t position) const {
-        return items_[static_cast<std::size_t>(position - 1)];
+        return m_oItems[static_cast<std::size_t>(position - 1)];
     }
     bool Has(std::int32_t position) const { return position >= 1 && position <= Count(); }
-    void Append(std::shared_ptr<T> item) { items_.push_back(std::move(item)); }
-    void RemoveAt(std::int32_t position) { items_.erase(items_.begin() + (position - 1)); }
-    void Clear() { items_ = Items(); }
-    typename Items::const_iterator begin() const { return items_.begin(); }
-    typename Items::const_iterator end() const { return items_.end(); }
+    void Append(std::shared_ptr<T> item) { m_oItems.push_back(std::move(item)); }
+    void RemoveAt(std::int32_t position) { m_oItems.erase(m_oItems.begin() + (position - 1)); }
+    void Clear() { m_oItems = Items(); }
+    typename Items::const_iterator begin() const { return m_oItems.begin(); }
+    typename Items::const_iterator end() const { return m_oItems.end(); }
 
     // The first item whose name equals `name`, ignoring case; null if none.
     std::shared_ptr<T> FindName(const std::string& name) const {
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             if (text::EqualsNoCase(item->Name(), name)) return item;
         return nullptr;
     }
@@ -85,7 +85,7 @@ public:
         return Has(position) ? position : 0;
     }
     bool ContainsUniqueId(const std::string& uniqueId) const {
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             if (text::EqualsNoCase(item->UniqueId(), uniqueId)) return true;
         return false;
     }
@@ -101,13 +101,13 @@ public:
     }
     std::string DefaultName(std::string_view base) const {
         std::vector<std::string> names;
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             names.push_back(item->Name());
         return MakeUniqueName(names, base);
     }
 
 private:
-    Items items_;
+    Items m_oItems;
 };
 
 class CIviFgenPropImp;
@@ -120,6 +120,9 @@ void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& 
 // call, the state given back on every way out. 0 when no session is open.
 std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source, ViAttr attribute);
 
+// The root's Path, "" for none; kept out of line, as the root is only declared here.
+std::string PathOf(const CIviFgenPropImp* propSet);
+
 // What the three collections of the tree share: their items, attach, path, bag keys and clone.
 // `Item` is the class of their members.
 template <typename Item>
@@ -129,26 +132,26 @@ public:
     // default names ("Channel").
     ModelCollection(const char* word, const char* itemWord) : word_(word), itemWord_(itemWord) {}
 
-    typename ItemList<Item>::Items::const_iterator begin() const { return items_.begin(); }
-    typename ItemList<Item>::Items::const_iterator end() const { return items_.end(); }
-    std::int32_t Count() const { return items_.Count(); }
-    const std::shared_ptr<Item>& At(std::int32_t position) const { return items_.At(position); }
+    typename ItemList<Item>::Items::const_iterator begin() const { return m_oItems.begin(); }
+    typename ItemList<Item>::Items::const_iterator end() const { return m_oItems.end(); }
+    std::int32_t Count() const { return m_oItems.Count(); }
+    const std::shared_ptr<Item>& At(std::int32_t position) const { return m_oItems.At(position); }
 
     void Attach(std::shared_ptr<CIviErrorReport> errorReport,
                 const std::shared_ptr<CIviFgenPropImp>& propSet) {
         m_oErr = std::move(errorReport);
         m_oPropSet = propSet;
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             item->Attach(m_oErr, propSet);
     }
     const std::string& Path() const { return m_sPath; }
     void SetPath(const std::string& parentPath) {
         m_sPath = JoinPath(parentPath, word_);
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             item->SetPath(m_sPath);
     }
     std::shared_ptr<CIviFgenPropImp> PropSet() const { return m_oPropSet.lock(); }
-    void InitProperties() { items_.Clear(); }
+    void InitProperties() { m_oItems.Clear(); }
 
     // A count above 0 replaces the items by that many, read in order, without events.
     template <typename Bag>
@@ -157,12 +160,12 @@ public:
         const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
         if (count <= 0) return;
         CheckItemCount(count, bag.Size(), p + "ItemCount");
-        items_.Clear();
+        m_oItems.Clear();
         for (std::int32_t i = 1; i <= count; ++i) {
             auto item = std::make_shared<Item>();
             item->Attach(m_oErr, PropSet());
             item->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-            items_.Append(std::move(item));
+            m_oItems.Append(std::move(item));
         }
     }
     template <typename Bag>
@@ -170,22 +173,22 @@ public:
         const std::string p = BagPrefix(prefix, word_);
         bag.WriteInt32(p + "ItemCount", Count(), 0);
         std::int32_t i = 0;
-        for (const auto& item : items_)
+        for (const auto& item : m_oItems)
             item->WriteProperties(bag, p + "Item" + std::to_string(++i) + "_");
     }
 
     bool ContainsObject(const Item& object) const {
-        return items_.ContainsUniqueId(object.UniqueId());
+        return m_oItems.ContainsUniqueId(object.UniqueId());
     }
-    std::int32_t IndexOfObject(const Item* object) const { return items_.IndexOfObject(object); }
-    std::int32_t IndexOfName(const std::string& name) const { return items_.IndexOfName(name); }
-    std::string DefaultName() const { return items_.DefaultName(itemWord_); }
+    std::int32_t IndexOfObject(const Item* object) const { return m_oItems.IndexOfObject(object); }
+    std::int32_t IndexOfName(const std::string& name) const { return m_oItems.IndexOfName(name); }
+    std::string DefaultName() const { return m_oItems.DefaultName(itemWord_); }
 
 protected:
     // Item of the collections: a miss is the failure `code` under Path + "Item".
     std::shared_ptr<Item> ItemOrRefuse(const Variant& index, std::int32_t code) {
         return Guard(m_oErr, "Item", [&] {
-            auto found = items_.Lookup(index);
+            auto found = m_oItems.Lookup(index);
             if (!found) StdError(m_oErr, code, m_sPath + "Item");
             return found;
         });
@@ -199,16 +202,24 @@ protected:
         return item;
     }
 
+    // A limit of the instrument for the public member `operation`, under that member's guard.
+    std::int32_t Limit(const char* operation, ViAttr attribute) {
+        return Guard(m_oErr, operation, [&] {
+            const auto propSet = PropSet();
+            return ReadInstrumentLimit(*m_oErr, PathOf(propSet.get()) + operation, attribute);
+        });
+    }
+
     // For each item: Add by its name in `target`, then Clone into the first of that name there.
     template <typename Collection>
     void CloneInto(Collection& target) const {
-        for (const auto& item : items_) {
+        for (const auto& item : m_oItems) {
             target.Add(item->Name());
             if (const auto copy = target.Item(item->Name())) item->Clone(*copy);
         }
     }
 
-    ItemList<Item> items_;
+    ItemList<Item> m_oItems;
     std::shared_ptr<CIviErrorReport> m_oErr;
     std::weak_ptr<CIviFgenPropImp> m_oPropSet;
     std::string m_sPath;

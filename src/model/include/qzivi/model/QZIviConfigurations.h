@@ -53,11 +53,11 @@ private:
 class QZIviConfigurations {
 public:
     // ---- Public; every failure reaches the caller ----
-    auto begin() const { return items_.begin(); }
-    auto end() const { return items_.end(); }
+    auto begin() const { return m_oItems.begin(); }
+    auto end() const { return m_oItems.end(); }
     // A number is a position; a text, even a numeric one, is a name compared exactly.
     std::shared_ptr<QZIviConfiguration> Item(const Variant& Index);
-    std::int32_t Count() const { return static_cast<std::int32_t>(items_.size()); }
+    std::int32_t Count() const { return static_cast<std::int32_t>(m_oItems.size()); }
     // A snapshot of the source set, or of the file when one is named.
     std::shared_ptr<QZIviConfiguration> Add(const std::string& Name,
                                             const std::string& FilePath = "");
@@ -84,7 +84,7 @@ public:
 private:
     std::shared_ptr<QZIviConfiguration> Find(const Variant& index) const;
 
-    std::vector<std::shared_ptr<QZIviConfiguration>> items_;
+    std::vector<std::shared_ptr<QZIviConfiguration>> m_oItems;
     std::shared_ptr<CIviErrorReport> m_oErr;
     CIviFgenPropImp* m_oSourceSet = nullptr;
     CIviFgenPropImp* m_oPropSet = nullptr;

@@ -55,11 +55,11 @@ class QZIviFgenSequence : public std::enable_shared_from_this<QZIviFgenSequence>
 public:
     // ---- Public ----
     using Items = std::vector<std::shared_ptr<QZIviFgenSequenceItem>>;
-    Items::const_iterator begin() const { return items_.begin(); }
-    Items::const_iterator end() const { return items_.end(); }
+    Items::const_iterator begin() const { return m_oItems.begin(); }
+    Items::const_iterator end() const { return m_oItems.end(); }
     // Positions only, no names; -31626 for anything else.
     std::shared_ptr<QZIviFgenSequenceItem> SequenceItem(const Variant& Index);
-    std::int32_t Count() const { return static_cast<std::int32_t>(items_.size()); }
+    std::int32_t Count() const { return static_cast<std::int32_t>(m_oItems.size()); }
     std::shared_ptr<QZIviFgenSequenceItem>
     Add(const std::shared_ptr<QZIviFgenArbWaveform>& Waveform = nullptr,
         std::int32_t Iterations = 0);
@@ -91,14 +91,14 @@ public:
     void CollapseIterations(bool value) { m_bCollapseIterations = value; }
     std::int32_t IndexOfObject(const QZIviFgenSequenceItem* item) const;
     const std::shared_ptr<QZIviFgenSequenceItem>& At(std::int32_t position) const {
-        return items_[static_cast<std::size_t>(position - 1)];
+        return m_oItems[static_cast<std::size_t>(position - 1)];
     }
     std::vector<std::int32_t> WaveformHandles() const;
     std::vector<std::int32_t> IterationCounts() const;
     std::int32_t PreviewDataSize();
 
 private:
-    Items items_; // no names here, so not an ItemList
+    Items m_oItems; // no names here, so not an ItemList
     std::string m_sName;
     std::int32_t m_lSequenceHandle = 0;
     std::int32_t m_lCurrentItem = 1;
@@ -126,9 +126,6 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenSequences& target) const { CloneInto(target); }
-
-private:
-    std::int32_t Limit(const char* operation, ViAttr attribute);
 };
 
 } // namespace qzivi

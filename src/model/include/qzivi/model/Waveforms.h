@@ -117,9 +117,6 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenArbWaveforms& target) const { CloneInto(target); }
-
-private:
-    std::int32_t Limit(const char* operation, ViAttr attribute);
 };
 
 } // namespace qzivi

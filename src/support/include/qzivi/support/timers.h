@@ -4,6 +4,7 @@
 #pragma once
 
 #include "qzivi/support/event.h"
+#include "qzivi/support/scoped_hook.h"
 
 #include <chrono>
 #include <cstdint>
@@ -26,6 +27,8 @@ public:
 // it replaces.
 ITickSource* SetTickSource(ITickSource* source);
 ITickSource& TickSource();
+// The tick source for the lifetime of a scope: the Qt layer's QTimer source, a test's loop.
+using TickSourceScope = ScopedHook<ITickSource*, &SetTickSource>;
 
 class CTimer : public std::enable_shared_from_this<CTimer> {
 public:
