@@ -375,7 +375,8 @@ ViStatus IviFgen_QueryArbSeqCapabilities(ViSession vi, ViInt32* maxNumSequences,
 
 ViStatus IviFgen_CreateArbSequence(ViSession vi, ViInt32 length, const ViInt32 waveformHandles[],
                                    const ViInt32 loopCounts[], ViInt32* handle) {
-    return QZIVI_FORWARD(CreateArbSequence, vi, length, TraceArray<ViInt32>{waveformHandles, length},
+    return QZIVI_FORWARD(CreateArbSequence, vi, length,
+                         TraceArray<ViInt32>{waveformHandles, length},
                          TraceArray<ViInt32>{loopCounts, length}, handle);
 }
 

@@ -65,8 +65,7 @@ ViStatus TracedEntry(const char* function, ClassSession* s, Body&& body, const A
     const bool timed = AlwaysTimed || TraceEnabled();
     const auto start = timed ? Clock::now() : Clock::time_point{};
     const ViStatus status = CEntry(function, RecordOf(s), body);
-    if (TraceEnabled())
-        try {
+    if (TraceEnabled()) try {
             Trace({function, FormatArguments(status, args...), status,
                    timed ? Clock::now() - start : Clock::duration{}});
         } catch (...) { // a trace that cannot be written loses its line, not the call
