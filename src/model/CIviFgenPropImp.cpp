@@ -144,6 +144,17 @@ void CIviFgenPropImp::RaiseCollectionChanged(const std::string& collectionName,
                                              const Variant& collection, std::int32_t kind,
                                              const Variant& first, const Variant& second) {
     CollectionChanged(collectionName, collection, kind, first, second);
+    // The tree's own members react once per notice, after the listeners.
+    if (kind != ChangeRemoved && kind != ChangeRenamed) return;
+    if (collectionName == "QZIviFgenArbWaveforms") {
+        m_oChannels->ForgetWaveforms();
+        if (kind == ChangeRenamed)
+            m_oSequences->WaveformRenamed(first.AsText(), second.AsText());
+        else
+            m_oSequences->WaveformRemoved();
+    } else if (collectionName == "QZIviFgenSequences") {
+        m_oChannels->ForgetSequences();
+    }
 }
 
 } // namespace qzivi

@@ -17,6 +17,7 @@ constexpr const char* kChannels = "QZIviFgenChannels";
 void QZIviFgenChannel::Name(const std::string& value) {
     const std::string old = m_sName;
     m_sName = value;
+    NameChanged(old);
     if (const auto propSet = PropSet())
         propSet->RaiseCollectionChanged(kChannels, Variant::Object(propSet->Channels()),
                                         ChangeRenamed, value, old);
@@ -52,18 +53,12 @@ void QZIviFgenChannel::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                               const std::shared_ptr<CIviFgenPropImp>& propSet) {
     m_oErr = std::move(errorReport);
     m_oPropSet = propSet;
-    m_cCollectionChanged.Disconnect();
-    if (propSet)
-        m_cCollectionChanged = propSet->CollectionChanged.Connect(
-            [this](const std::string& name, const Variant&, std::int32_t kind, const Variant&,
-                   const Variant&) { OnCollectionChanged(name, kind); });
 }
 
-// Any rename or removal of a waveform or sequence drops the reference, whichever one it was.
-void QZIviFgenChannel::OnCollectionChanged(const std::string& name, std::int32_t kind) {
-    if (kind != ChangeRemoved && kind != ChangeRenamed) return;
-    if (name == "QZIviFgenArbWaveforms") m_oArbWaveform = nullptr;
-    if (name == "QZIviFgenSequences") m_oSequence = nullptr;
+void QZIviFgenChannel::UniqueId(const std::string& value) {
+    const std::string old = m_sUniqueId;
+    m_sUniqueId = value;
+    UniqueIdChanged(old);
 }
 
 void QZIviFgenChannel::SetPath(const std::string& parentPath) {
@@ -111,13 +106,13 @@ void QZIviFgenChannel::InitProperties() {
     PutDefaults(Properties(), *this);
     ArbWaveform(nullptr);
     Sequence(nullptr);
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
 }
 
 void QZIviFgenChannel::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
     const std::string p = BagPrefix(prefix, "Channel");
     ReadRows(Properties(), *this, bag, p);
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
     const auto propSet = PropSet();
     if (!propSet) return;
     if (const std::int32_t index = bag.ReadInt32(p + "ArbWaveform", 0); index > 0)
@@ -183,6 +178,17 @@ void QZIviFgenChannels::Remove(const Variant& Index) {
             propSet->RaiseCollectionChanged(kChannels, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
     });
+}
+
+// Any rename or removal of a waveform or sequence drops the reference, whichever one it was.
+void QZIviFgenChannels::ForgetWaveforms() {
+    for (const auto& channel : m_oItems)
+        channel->m_oArbWaveform = nullptr;
+}
+
+void QZIviFgenChannels::ForgetSequences() {
+    for (const auto& channel : m_oItems)
+        channel->m_oSequence = nullptr;
 }
 
 std::shared_ptr<QZIviFgenChannel> QZIviFgenChannels::ActiveChannel() {

@@ -38,3 +38,19 @@ std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source
 }
 
 } // namespace qzivi
+
+namespace qzivi {
+
+std::int64_t DefaultNumberOf(std::string_view folded, std::string_view foldedBase) {
+    if (folded.size() <= foldedBase.size() || folded.size() > foldedBase.size() + 10 ||
+        folded.substr(0, foldedBase.size()) != foldedBase || folded[foldedBase.size()] == '0')
+        return 0;
+    std::int64_t n = 0;
+    for (const char c : folded.substr(foldedBase.size())) {
+        if (c < '0' || c > '9') return 0;
+        n = n * 10 + (c - '0');
+    }
+    return n <= 2147483647 ? n : 0;
+}
+
+} // namespace qzivi

@@ -97,34 +97,59 @@ bool operator==(const SharedBytes& a, const SharedBytes& b) {
     return a.size_ == b.size_ && (a.size_ == 0 || std::memcmp(a.data(), b.data(), a.size_) == 0);
 }
 
+namespace {
+char Fold(char c) {
+    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+}
+} // namespace
+
+std::size_t PropertyBag::NoCaseHash::operator()(std::string_view name) const {
+    std::size_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
+    for (const char c : name)
+        hash = (hash ^ static_cast<unsigned char>(Fold(c))) * 1099511628211ull;
+    return hash;
+}
+
+bool PropertyBag::NoCaseEqual::operator()(std::string_view a, std::string_view b) const {
+    if (a.size() != b.size()) return false;
+    for (std::size_t i = 0; i < a.size(); ++i)
+        if (Fold(a[i]) != Fold(b[i])) return false;
+    return true;
+}
+
 const PropertyBag::Value* PropertyBag::Find(std::string_view name) const {
-    const auto found = index_.find(text::Lower(name));
+    const auto found = index_.find(name);
     return found == index_.end() ? nullptr : &entries_[found->second].value;
 }
 
 void PropertyBag::Store(std::string_view name, Value value) {
-    auto [at, added] = index_.emplace(text::Lower(name), entries_.size());
-    if (added)
-        entries_.push_back({std::string(name), std::move(value)});
-    else
-        entries_[at->second].value = std::move(value);
+    const auto found = index_.find(name);
+    if (found != index_.end()) {
+        entries_[found->second].value = std::move(value);
+        return;
+    }
+    index_.emplace(std::string(name), entries_.size());
+    entries_.push_back({std::string(name), std::move(value)});
 }
 
 void PropertyBag::Remove(std::string_view name) {
-    const auto found = index_.find(text::Lower(name));
+    const auto found = index_.find(name);
     if (found == index_.end()) return;
-    const std::size_t position = found->second;
-    entries_.erase(entries_.begin() + static_cast<std::ptrdiff_t>(position));
+    Entry& entry = entries_[found->second];
+    entry.name.clear();
+    entry.value = Value();
     index_.erase(found);
-    for (auto& [key, i] : index_)
-        if (i > position) --i;
+    if (2 * ++removed_ <= entries_.size()) return;
+    std::erase_if(entries_, [](const Entry& e) { return e.name.empty(); });
+    removed_ = 0;
+    for (std::size_t i = 0; i < entries_.size(); ++i)
+        index_.find(entries_[i].name)->second = i;
 }
 
 std::vector<std::string> PropertyBag::Names() const {
     std::vector<std::string> names;
-    names.reserve(entries_.size());
-    for (const auto& entry : entries_)
-        names.push_back(entry.name);
+    names.reserve(Size());
+    ForEachEntry([&](const std::string& name, const Value&) { names.push_back(name); });
     return names;
 }
 
@@ -135,6 +160,7 @@ bool PropertyBag::Contains(std::string_view name) const {
 void PropertyBag::Clear() {
     entries_.clear();
     index_.clear();
+    removed_ = 0;
 }
 
 std::int32_t PropertyBag::ReadInt32(std::string_view name, std::int32_t defaultValue) const {
@@ -198,10 +224,14 @@ void PropertyBag::WriteBytes(std::string_view name, SharedBytes value) {
 }
 
 Bytes PropertyBag::Contents() const {
+    // Sized once, so that a bag of large byte values is copied once and never regrown.
+    std::size_t size = 0;
+    WriteContents([&](const void*, std::size_t n) { size += n; });
     Bytes out;
-    WriteContents([&](const void* data, std::size_t size) {
+    out.reserve(size);
+    WriteContents([&](const void* data, std::size_t n) {
         const auto* bytes = static_cast<const std::uint8_t*>(data);
-        out.insert(out.end(), bytes, bytes + size);
+        out.insert(out.end(), bytes, bytes + n);
     });
     return out;
 }
@@ -210,8 +240,8 @@ void PropertyBag::WriteContents(const std::function<void(const void*, std::size_
     Writer w(sink);
     w.Raw(kMagic, sizeof kMagic);
     w.Put(kVersion);
-    w.Put(static_cast<std::uint32_t>(entries_.size()));
-    for (const auto& [name, value] : entries_) {
+    w.Put(static_cast<std::uint32_t>(Size()));
+    ForEachEntry([&](const std::string& name, const Value& value) {
         w.Put(static_cast<std::uint16_t>(name.size()));
         w.Raw(name.data(), name.size());
         switch (value.index()) {
@@ -242,7 +272,7 @@ void PropertyBag::WriteContents(const std::function<void(const void*, std::size_
             break;
         }
         }
-    }
+    });
 }
 
 void PropertyBag::SetContents(std::span<const std::uint8_t> block) {
@@ -302,12 +332,13 @@ void PropertyBag::SetContents(const SharedBytes& shared) {
 }
 
 bool operator==(const PropertyBag& a, const PropertyBag& b) {
-    if (a.entries_.size() != b.entries_.size()) return false;
-    for (const auto& [name, value] : a.entries_) {
+    if (a.Size() != b.Size()) return false;
+    bool equal = true;
+    a.ForEachEntry([&](const std::string& name, const PropertyBag::Value& value) {
         const PropertyBag::Value* other = b.Find(name);
-        if (other == nullptr || !(*other == value)) return false;
-    }
-    return true;
+        equal = equal && other != nullptr && *other == value;
+    });
+    return equal;
 }
 
 } // namespace qzivi

@@ -28,8 +28,8 @@ void Ignoring(F&& step) {
 
 void QZIviFgenSequenceItem::Waveform(const std::shared_ptr<QZIviFgenArbWaveform>& value) {
     Guard(m_oErr, "Waveform", [&] {
+        const auto propSet = PropSet();
         if (value) {
-            const auto propSet = PropSet();
             if (!propSet)
                 RaiseRuntime(91,
                              "Object variable not set: the sequence item belongs to no control.");
@@ -37,6 +37,7 @@ void QZIviFgenSequenceItem::Waveform(const std::shared_ptr<QZIviFgenArbWaveform>
                 StdError(m_oErr, errid::kForeignObject, m_sPath + "Waveform");
         }
         m_oWaveform = value;
+        if (propSet) propSet->Sequences()->Refer(*this);
     });
 }
 
@@ -44,28 +45,6 @@ void QZIviFgenSequenceItem::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                                    const std::shared_ptr<CIviFgenPropImp>& propSet) {
     m_oErr = std::move(errorReport);
     m_oPropSet = propSet;
-    m_cCollectionChanged.Disconnect();
-    if (propSet)
-        m_cCollectionChanged = propSet->CollectionChanged.Connect(
-            [this](const std::string& name, const Variant& collection, std::int32_t kind,
-                   const Variant& first, const Variant& second) {
-                OnCollectionChanged(name, collection, kind, first, second);
-            });
-}
-
-void QZIviFgenSequenceItem::OnCollectionChanged(const std::string& name, const Variant& collection,
-                                                std::int32_t kind, const Variant& first,
-                                                const Variant& second) {
-    if (name != "QZIviFgenArbWaveforms" || !m_oWaveform) return;
-    if (kind == ChangeRemoved) {
-        const auto waveforms = collection.AsObject<QZIviFgenArbWaveforms>();
-        if (waveforms && waveforms->IndexOfName(m_oWaveform->Name()) == -1) m_oWaveform = nullptr;
-    } else if (kind == ChangeRenamed) {
-        // A waveform object of another copy of the tree follows the rename of its twin here.
-        const std::string now = first.AsText(), before = second.AsText();
-        if (!now.empty() && m_oWaveform->Name() != now && m_oWaveform->Name() == before)
-            m_oWaveform->Name(now);
-    }
 }
 
 void QZIviFgenSequenceItem::InitProperties() {
@@ -77,8 +56,8 @@ void QZIviFgenSequenceItem::ReadProperties(const PropertyBag& bag, const std::st
     const std::string p = BagPrefix(prefix, "SequenceItem");
     Iterations(bag.ReadInt32(p + "Iterations", 0));
     const std::int32_t index = bag.ReadInt32(p + "Waveform", 0);
-    if (index > 0)
-        if (const auto propSet = PropSet()) Waveform(propSet->Waveforms()->Item(index));
+    const auto propSet = PropSet();
+    Waveform(index > 0 && propSet ? propSet->Waveforms()->Item(index) : nullptr);
 }
 
 void QZIviFgenSequenceItem::WriteProperties(PropertyBag& bag, const std::string& prefix) const {
@@ -98,9 +77,7 @@ void QZIviFgenSequenceItem::Clone(QZIviFgenSequenceItem& target) const {
 // ---- QZIviFgenSequence ----------------------------------------------------------------------
 
 std::int32_t QZIviFgenSequence::IndexOfObject(const QZIviFgenSequenceItem* item) const {
-    for (std::int32_t i = 1; i <= Count(); ++i)
-        if (At(i).get() == item) return i;
-    return -1;
+    return m_oItems.IndexOfObject(item);
 }
 
 std::shared_ptr<QZIviFgenSequenceItem> QZIviFgenSequence::SequenceItem(const Variant& Index) {
@@ -121,11 +98,12 @@ QZIviFgenSequence::Add(const std::shared_ptr<QZIviFgenArbWaveform>& Waveform,
     return Guard(m_oErr, "Add", [&] {
         auto item = std::make_shared<QZIviFgenSequenceItem>();
         item->Attach(m_oErr, PropSet());
+        item->Sequence(this);
         item->InitProperties();
         // The setter's own frame reports a foreign waveform; it ends this Add only if it raises.
         item->Waveform(Waveform);
         item->Iterations(Iterations);
-        m_oItems.push_back(item);
+        m_oItems.Append(item);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
                                             ChangeAdded, Count(), "");
@@ -138,7 +116,7 @@ void QZIviFgenSequence::Remove(const Variant& Index) {
         const std::int32_t position = Index.IsNumeric() ? Index.AsInt32() : 0;
         if (position < 1 || position > Count())
             StdError(m_oErr, errid::kInvalidIndex, m_sPath + "Remove");
-        m_oItems.erase(m_oItems.begin() + (position - 1));
+        m_oItems.RemoveAt(position);
         if (const auto propSet = PropSet())
             propSet->RaiseCollectionChanged(kSequence, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
@@ -148,6 +126,7 @@ void QZIviFgenSequence::Remove(const Variant& Index) {
 void QZIviFgenSequence::Name(const std::string& value) {
     const std::string old = m_sName;
     m_sName = value;
+    NameChanged(old);
     if (const auto propSet = PropSet())
         propSet->RaiseCollectionChanged(kSequences, Variant::Object(propSet->Sequences()),
                                         ChangeRenamed, value, old);
@@ -267,6 +246,12 @@ std::vector<std::int32_t> QZIviFgenSequence::IterationCounts() const {
     return counts;
 }
 
+void QZIviFgenSequence::UniqueId(const std::string& value) {
+    const std::string old = m_sUniqueId;
+    m_sUniqueId = value;
+    UniqueIdChanged(old);
+}
+
 void QZIviFgenSequence::Attach(std::shared_ptr<CIviErrorReport> errorReport,
                                const std::shared_ptr<CIviFgenPropImp>& propSet) {
     m_oErr = std::move(errorReport);
@@ -282,27 +267,28 @@ void QZIviFgenSequence::SetPath(const std::string& parentPath) {
 }
 
 void QZIviFgenSequence::InitProperties() {
-    m_oItems.clear();
+    m_oItems.Clear();
     Name("");
     m_lSequenceHandle = 0;
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
     m_lCurrentItem = 1;
 }
 
 void QZIviFgenSequence::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
     const std::string p = BagPrefix(prefix, "Sequence");
     Name(bag.ReadText(p + "Name", ""));
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
     m_lCurrentItem = 1;
     const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
     if (count <= 0) return;
     CheckItemCount(count, bag.Size(), p + "ItemCount");
-    m_oItems.clear();
+    m_oItems.Clear();
     for (std::int32_t i = 1; i <= count; ++i) {
         auto item = std::make_shared<QZIviFgenSequenceItem>();
         item->Attach(m_oErr, PropSet());
+        item->Sequence(this);
         item->ReadProperties(bag, p + "Item" + std::to_string(i) + "_");
-        m_oItems.push_back(std::move(item));
+        m_oItems.Append(std::move(item));
     }
 }
 
@@ -353,6 +339,127 @@ void QZIviFgenSequences::Remove(const Variant& Index) {
             propSet->RaiseCollectionChanged(kSequences, Variant::Object(shared_from_this()),
                                             ChangeRemoved, position, "");
     });
+}
+
+// ---- The items' waveforms -----------------------------------------------------------------------
+
+void QZIviFgenSequences::InitProperties() {
+    ModelCollection::InitProperties();
+    m_oUsers.clear();
+    m_oForeign.clear();
+    m_oWithoutWaveform.clear();
+}
+
+bool QZIviFgenSequences::InTree(const QZIviFgenSequenceItem& item) const {
+    const QZIviFgenSequence* sequence = item.Sequence();
+    return sequence != nullptr && Holds(*sequence);
+}
+
+void QZIviFgenSequences::Refer(QZIviFgenSequenceItem& item) {
+    auto self = item.weak_from_this();
+    if (self.expired()) return; // an item no tree can hold
+    const QZIviFgenArbWaveform* waveform = item.m_oWaveform.get();
+    if (!waveform) {
+        m_oWithoutWaveform.push_back(std::move(self));
+        return;
+    }
+    m_oUsers[waveform].push_back(std::move(self));
+    if (const auto propSet = PropSet(); propSet && !propSet->Waveforms()->Holds(*waveform))
+        m_oForeign.insert(waveform);
+}
+
+std::vector<std::shared_ptr<QZIviFgenSequenceItem>>
+QZIviFgenSequences::UsersOf(const QZIviFgenArbWaveform* waveform) {
+    std::vector<std::shared_ptr<QZIviFgenSequenceItem>> users;
+    const auto found = m_oUsers.find(waveform);
+    if (found == m_oUsers.end()) return users;
+    Users& entries = found->second;
+    std::erase_if(entries, [&](const std::weak_ptr<QZIviFgenSequenceItem>& entry) {
+        const auto item = entry.lock();
+        if (!item || item->m_oWaveform.get() != waveform || !InTree(*item)) return true;
+        if (std::find(users.begin(), users.end(), item) != users.end()) return true; // twice
+        users.push_back(item);
+        return false;
+    });
+    if (entries.empty()) m_oUsers.erase(found);
+    return users;
+}
+
+std::vector<const QZIviFgenArbWaveform*> QZIviFgenSequences::ForeignNamed(const std::string& name,
+                                                                          bool ignoreCase) {
+    std::vector<const QZIviFgenArbWaveform*> named;
+    for (auto it = m_oForeign.begin(); it != m_oForeign.end();) {
+        const auto users = UsersOf(*it);
+        if (users.empty()) { // no item holds it: it may be gone
+            it = m_oForeign.erase(it);
+            continue;
+        }
+        const std::string& own = users.front()->m_oWaveform->Name();
+        if (ignoreCase ? text::EqualsNoCase(own, name) : own == name) named.push_back(*it);
+        ++it;
+    }
+    return named;
+}
+
+void QZIviFgenSequences::RemoveItemsOf(const QZIviFgenArbWaveform& waveform) {
+    std::erase_if(m_oWithoutWaveform, [&](const std::weak_ptr<QZIviFgenSequenceItem>& entry) {
+        const auto item = entry.lock();
+        return !item || item->m_oWaveform || !InTree(*item);
+    });
+    if (!m_oWithoutWaveform.empty())
+        RaiseRuntime(91, "Object variable not set: a sequence item has no waveform.");
+    const auto propSet = PropSet();
+    std::vector<const QZIviFgenArbWaveform*> named = ForeignNamed(waveform.Name(), true);
+    if (propSet)
+        for (const QZIviFgenArbWaveform* own : propSet->Waveforms()->Named(waveform.Name()))
+            named.push_back(own);
+    struct Place {
+        std::int32_t sequence, item;
+    };
+    std::vector<Place> places;
+    for (const QZIviFgenArbWaveform* each : named)
+        for (const auto& item : UsersOf(each))
+            places.push_back(
+                {IndexOfObject(item->Sequence()), item->Sequence()->IndexOfObject(item.get())});
+    // The last sequence first, and in each the last item first, so positions stay true.
+    std::sort(places.begin(), places.end(), [](const Place& a, const Place& b) {
+        return a.sequence != b.sequence ? a.sequence > b.sequence : a.item > b.item;
+    });
+    for (const Place& place : places)
+        At(place.sequence)->Remove(place.item);
+}
+
+void QZIviFgenSequences::WaveformRenamed(const std::string& now, const std::string& before) {
+    if (now.empty()) return; // a rename to nothing is not followed
+    const auto propSet = PropSet();
+    std::vector<const QZIviFgenArbWaveform*> named = ForeignNamed(before, false);
+    if (propSet)
+        for (const QZIviFgenArbWaveform* own : propSet->Waveforms()->Named(before))
+            if (own->Name() == before) named.push_back(own);
+    for (const QZIviFgenArbWaveform* each : named) {
+        const auto users = UsersOf(each);
+        if (!users.empty() && each->Name() == before) users.front()->m_oWaveform->Name(now);
+    }
+}
+
+void QZIviFgenSequences::WaveformRemoved() {
+    const auto propSet = PropSet();
+    if (!propSet) return;
+    std::vector<std::shared_ptr<QZIviFgenSequenceItem>> lost;
+    for (auto it = m_oForeign.begin(); it != m_oForeign.end();) {
+        const auto users = UsersOf(*it);
+        if (!users.empty() &&
+            propSet->Waveforms()->IndexOfName(users.front()->m_oWaveform->Name()) != -1) {
+            ++it;
+            continue;
+        }
+        lost.insert(lost.end(), users.begin(), users.end());
+        it = m_oForeign.erase(it);
+    }
+    for (const auto& item : lost) {
+        item->m_oWaveform = nullptr;
+        Refer(*item);
+    }
 }
 
 std::int32_t QZIviFgenSequences::GetMaxLoopCount() {

@@ -34,9 +34,16 @@ constexpr const char* kCollection = "QZIviFgenArbWaveforms";
 void QZIviFgenArbWaveform::Name(const std::string& value) {
     const std::string old = m_sName;
     m_sName = value;
+    NameChanged(old);
     if (const auto propSet = PropSet())
         propSet->RaiseCollectionChanged(kCollection, Variant::Object(propSet->Waveforms()),
                                         ChangeRenamed, value, old);
+}
+
+void QZIviFgenArbWaveform::UniqueId(const std::string& value) {
+    const std::string old = m_sUniqueId;
+    m_sUniqueId = value;
+    UniqueIdChanged(old);
 }
 
 void QZIviFgenArbWaveform::Filename(const std::string& value) {
@@ -161,7 +168,7 @@ void QZIviFgenArbWaveform::InitProperties() {
     m_lPersistedWfmSource = 1;
     m_bDataGotOnce = false;
     m_aData = nullptr;
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
 }
 
 void QZIviFgenArbWaveform::ReadProperties(const PropertyBag& bag, const std::string& prefix) {
@@ -172,7 +179,7 @@ void QZIviFgenArbWaveform::ReadProperties(const PropertyBag& bag, const std::str
     AutoNormalizeMode(bag.ReadInt32(p + "AutoNormalizeMode", 1));
     PersistedWfmSource(bag.ReadText(p + "PersistedWfmSource", "1"));
     DataGotOnce(bag.ReadBool(p + "DataGotOnce", false));
-    m_sUniqueId = NewUniqueId();
+    UniqueId(NewUniqueId());
     if (m_lSource != 0) return;
     const std::int32_t byteSize = bag.ReadInt32(p + "ByteSize", 0);
     if (byteSize <= 0) return;
@@ -262,19 +269,8 @@ void QZIviFgenArbWaveforms::Remove(const Variant& Index) {
         const auto waveform = m_oItems.At(position);
         Queue(waveform->WaveformHandle());
         const auto propSet = PropSet();
-        if (propSet && propSet->Sequences() && propSet->Sequences()->Count() > 0) {
-            const auto& sequences = *propSet->Sequences();
-            for (std::int32_t s = sequences.Count(); s >= 1; --s) {
-                const auto sequence = sequences.At(s);
-                for (std::int32_t i = sequence->Count(); i >= 1; --i) {
-                    const auto referred = sequence->At(i)->Waveform();
-                    if (!referred)
-                        RaiseRuntime(91,
-                                     "Object variable not set: a sequence item has no waveform.");
-                    if (text::EqualsNoCase(referred->Name(), waveform->Name())) sequence->Remove(i);
-                }
-            }
-        }
+        if (propSet && propSet->Sequences()->Count() > 0)
+            propSet->Sequences()->RemoveItemsOf(*waveform);
         m_oItems.RemoveAt(position);
         if (propSet)
             propSet->RaiseCollectionChanged(kCollection, Variant::Object(shared_from_this()),

@@ -25,7 +25,7 @@ enum QZIviFgenOperationModes : std::int32_t {
 };
 
 // A pure state holder: values are stored as given; the instrument judges them at Configure.
-class QZIviFgenChannel {
+class QZIviFgenChannel : public ListMember<QZIviFgenChannel> {
 public:
     QZIviFgenChannel();
 
@@ -76,7 +76,6 @@ public:
     void TriggerSource(std::int32_t value) { m_lTriggerSource = value; }
 
     // ---- Internal ----
-    // Also follows CollectionChanged of `propSet`.
     void Attach(std::shared_ptr<CIviErrorReport> errorReport,
                 const std::shared_ptr<CIviFgenPropImp>& propSet);
     const std::string& Path() const { return m_sPath; }
@@ -87,13 +86,13 @@ public:
     void WriteProperties(PropertyBag& bag, const std::string& prefix) const;
     void Clone(QZIviFgenChannel& target) const;
     const std::string& UniqueId() const { return m_sUniqueId; }
-    void UniqueId(const std::string& value) { m_sUniqueId = value; }
+    void UniqueId(const std::string& value);
 
     // The properties in the order of their notices and bag keys; the references come last.
     static std::span<const PropertyRow<QZIviFgenChannel>> Properties();
 
 private:
-    void OnCollectionChanged(const std::string& name, std::int32_t kind);
+    friend class QZIviFgenChannels;
 
     // Their defaults are the table's.
     std::string m_sName;
@@ -121,7 +120,6 @@ private:
     std::weak_ptr<CIviFgenPropImp> m_oPropSet;
     std::string m_sPath;
     std::string m_sUniqueId;
-    Connection m_cCollectionChanged;
 };
 
 class QZIviFgenChannels : public std::enable_shared_from_this<QZIviFgenChannels>,
@@ -139,6 +137,9 @@ public:
 
     // ---- Internal ----
     void Clone(QZIviFgenChannels& target) const { CloneInto(target); }
+    // The tree's reactions to a rename or removal of a waveform, or of a sequence.
+    void ForgetWaveforms();
+    void ForgetSequences();
 
 private:
     std::shared_ptr<QZIviFgenChannel> m_oActiveChannel;

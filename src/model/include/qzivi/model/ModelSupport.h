@@ -6,6 +6,7 @@
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/driver/StringTable.h"
 #include "qzivi/model/Conventions.h"
+#include "qzivi/model/ItemList.h"
 #include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 #include "qzivi/support/variant.h"
@@ -38,78 +39,6 @@ auto Guard(const std::shared_ptr<CIviErrorReport>& err, const char* source, F&& 
     throw Failure(code, source, LoadResString(-code) + " (" + source + ")");
 }
 
-// An ordered list that keeps insertion order and does not enforce unique names. Positions count
-// from 1 at the interface.
-template <typename T>
-class ItemList {
-public:
-    using Items = std::vector<std::shared_ptr<T>>;
-
-    std::int32_t Count() const { return static_cast<std::int32_t>(m_oItems.size()); }
-    const std::shared_ptr<T>& At(std::int32_t position) const {
-        return m_oItems[static_cast<std::size_t>(position - 1)];
-    }
-    bool Has(std::int32_t position) const { return position >= 1 && position <= Count(); }
-    void Append(std::shared_ptr<T> item) { m_oItems.push_back(std::move(item)); }
-    void RemoveAt(std::int32_t position) { m_oItems.erase(m_oItems.begin() + (position - 1)); }
-    void Clear() { m_oItems = Items(); }
-    typename Items::const_iterator begin() const { return m_oItems.begin(); }
-    typename Items::const_iterator end() const { return m_oItems.end(); }
-
-    // The first item whose name equals `name`, ignoring case; null if none.
-    std::shared_ptr<T> FindName(const std::string& name) const {
-        for (const auto& item : m_oItems)
-            if (text::EqualsNoCase(item->Name(), name)) return item;
-        return nullptr;
-    }
-    // Position by a tagged index for Item: a number (not a text) is a position, anything else a
-    // name; null when neither finds one.
-    std::shared_ptr<T> Lookup(const Variant& index) const {
-        if (index.IsNumber()) {
-            const std::int32_t position = index.AsInt32();
-            return Has(position) ? At(position) : nullptr;
-        }
-        return FindName(index.AsText());
-    }
-    // Position by a tagged index for Remove: a numeric value (a numeric text too) is a position,
-    // anything else the first name that equals it; 0 when nothing fits.
-    std::int32_t RemovalPosition(const Variant& index) const {
-        std::int32_t position = 0;
-        if (index.IsNumeric()) {
-            position = index.AsInt32();
-        } else if (!index.IsEmpty() && !index.IsMissing()) {
-            const std::string name = index.AsText();
-            for (std::int32_t i = 1; i <= Count() && position == 0; ++i)
-                if (text::EqualsNoCase(At(i)->Name(), name)) position = i;
-        }
-        return Has(position) ? position : 0;
-    }
-    bool ContainsUniqueId(const std::string& uniqueId) const {
-        for (const auto& item : m_oItems)
-            if (text::EqualsNoCase(item->UniqueId(), uniqueId)) return true;
-        return false;
-    }
-    std::int32_t IndexOfObject(const T* object) const {
-        for (std::int32_t i = 1; i <= Count(); ++i)
-            if (At(i).get() == object) return i;
-        return -1;
-    }
-    std::int32_t IndexOfName(const std::string& name) const {
-        for (std::int32_t i = 1; i <= Count(); ++i)
-            if (At(i)->Name() == name) return i;
-        return -1;
-    }
-    std::string DefaultName(std::string_view base) const {
-        std::vector<std::string> names;
-        for (const auto& item : m_oItems)
-            names.push_back(item->Name());
-        return MakeUniqueName(names, base);
-    }
-
-private:
-    Items m_oItems;
-};
-
 class CIviFgenPropImp;
 class PropertyBag;
 
@@ -130,10 +59,11 @@ class ModelCollection {
 public:
     // `word` names the collection in bag keys and paths ("Channels"), `itemWord` its members'
     // default names ("Channel").
-    ModelCollection(const char* word, const char* itemWord) : word_(word), itemWord_(itemWord) {}
+    ModelCollection(const char* word, const char* itemWord)
+        : m_oItems(itemWord), word_(word), itemWord_(itemWord) {}
 
-    typename ItemList<Item>::Items::const_iterator begin() const { return m_oItems.begin(); }
-    typename ItemList<Item>::Items::const_iterator end() const { return m_oItems.end(); }
+    typename ItemList<Item>::const_iterator begin() const { return m_oItems.begin(); }
+    typename ItemList<Item>::const_iterator end() const { return m_oItems.end(); }
     std::int32_t Count() const { return m_oItems.Count(); }
     const std::shared_ptr<Item>& At(std::int32_t position) const { return m_oItems.At(position); }
 
@@ -178,11 +108,14 @@ public:
     }
 
     bool ContainsObject(const Item& object) const {
-        return m_oItems.ContainsUniqueId(object.UniqueId());
+        return m_oItems.Holds(object) || m_oItems.ContainsUniqueId(object.UniqueId());
     }
     std::int32_t IndexOfObject(const Item* object) const { return m_oItems.IndexOfObject(object); }
     std::int32_t IndexOfName(const std::string& name) const { return m_oItems.IndexOfName(name); }
-    std::string DefaultName() const { return m_oItems.DefaultName(itemWord_); }
+    std::string DefaultName() { return m_oItems.DefaultName(itemWord_); }
+    // The members named `name`, ignoring case.
+    const std::vector<Item*>& Named(const std::string& name) const { return m_oItems.Named(name); }
+    bool Holds(const Item& object) const { return m_oItems.Holds(object); }
 
 protected:
     // Item of the collections: a miss is the failure `code` under Path + "Item".

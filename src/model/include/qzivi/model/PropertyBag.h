@@ -75,7 +75,7 @@ public:
     bool Contains(std::string_view name) const;
     // The names in the order they were first stored.
     std::vector<std::string> Names() const;
-    std::size_t Size() const { return entries_.size(); }
+    std::size_t Size() const { return entries_.size() - removed_; }
     void Clear();
 
     Bytes Contents() const;
@@ -92,15 +92,31 @@ public:
 
 private:
     struct Entry {
-        std::string name;
+        std::string name; // empty once removed
         Value value;
+    };
+    // Names compared and hashed ignoring case, looked up without a copy.
+    struct NoCaseHash {
+        using is_transparent = void;
+        std::size_t operator()(std::string_view name) const;
+    };
+    struct NoCaseEqual {
+        using is_transparent = void;
+        bool operator()(std::string_view a, std::string_view b) const;
     };
     const Value* Find(std::string_view name) const;
     void Store(std::string_view name, Value value);
+    // Leaves a hole in the order, closed once holes are half the entries: O(1) amortized.
     void Remove(std::string_view name);
+    template <typename F>
+    void ForEachEntry(F&& f) const {
+        for (const auto& entry : entries_)
+            if (!entry.name.empty()) f(entry.name, entry.value);
+    }
 
     std::vector<Entry> entries_;
-    std::unordered_map<std::string, std::size_t> index_; // lower-case name -> entry
+    std::size_t removed_ = 0;
+    std::unordered_map<std::string, std::size_t, NoCaseHash, NoCaseEqual> index_; // -> entry
 };
 
 } // namespace qzivi

@@ -20,7 +20,8 @@ class PropertyBag;
 // Points are shared and never changed once made; null stands for "no points".
 using Points = std::shared_ptr<const std::vector<double>>;
 
-class QZIviFgenArbWaveform : public std::enable_shared_from_this<QZIviFgenArbWaveform> {
+class QZIviFgenArbWaveform : public std::enable_shared_from_this<QZIviFgenArbWaveform>,
+                             public ListMember<QZIviFgenArbWaveform> {
 public:
     // ---- Public ----
     const std::string& Name() const { return m_sName; }
@@ -53,7 +54,7 @@ public:
     void WriteProperties(PropertyBag& bag, const std::string& prefix);
     void Clone(QZIviFgenArbWaveform& target);
     const std::string& UniqueId() const { return m_sUniqueId; }
-    void UniqueId(const std::string& value) { m_sUniqueId = value; }
+    void UniqueId(const std::string& value);
     void SetWaveformHandle(std::int32_t handle) { m_lWaveformHandle = handle; }
     std::string PersistedWfmSource() const { return std::to_string(m_lPersistedWfmSource); }
     void PersistedWfmSource(const std::string& value);
