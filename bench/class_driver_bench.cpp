@@ -6,6 +6,9 @@
 #include <benchmark/benchmark.h>
 
 #include <cstdlib>
+#include <cstring>
+#include <memory>
+#include <vector>
 
 namespace {
 
@@ -77,8 +80,52 @@ void ConfigureOutputMode_Direct(benchmark::State& state) {
         benchmark::DoNotOptimize(QZSimFgen_ConfigureOutputMode(vi, IVIFGEN_VAL_OUTPUT_FUNC));
 }
 
+// A 10-million-point download: the simulator checks the range of each point as it copies it,
+// set beside a plain copy of the same points into new memory.
+std::vector<ViReal64>& BigWaveform() {
+    static std::vector<ViReal64> points = [] {
+        std::vector<ViReal64> p(10'000'000);
+        for (std::size_t i = 0; i < p.size(); ++i)
+            p[i] = static_cast<double>(i % 2000) / 1000.0 - 1.0;
+        return p;
+    }();
+    return points;
+}
+
+void CreateArbWaveform10M_Simulator(benchmark::State& state) {
+    ViSession vi = 0;
+    if (QZSimFgen_InitWithOptions("", VI_FALSE, VI_TRUE,
+                                  "DriverSetup=MaxWaveformSize=10000000;Memory=10000000",
+                                  &vi) != VI_SUCCESS)
+        std::abort();
+    const auto& points = BigWaveform();
+    for (auto _ : state) {
+        ViInt32 handle = 0;
+        QZSimFgen_CreateArbWaveform(vi, static_cast<ViInt32>(points.size()), points.data(),
+                                    &handle);
+        state.PauseTiming();
+        QZSimFgen_ClearArbWaveform(vi, handle);
+        state.ResumeTiming();
+    }
+    QZSimFgen_close(vi);
+}
+
+void CreateArbWaveform10M_PlainCopy(benchmark::State& state) {
+    const auto& points = BigWaveform();
+    for (auto _ : state) {
+        auto copy = std::make_unique_for_overwrite<double[]>(points.size());
+        std::memcpy(copy.get(), points.data(), points.size() * sizeof(double));
+        benchmark::DoNotOptimize(copy.get());
+        state.PauseTiming();
+        copy.reset();
+        state.ResumeTiming();
+    }
+}
+
 } // namespace
 
+BENCHMARK(CreateArbWaveform10M_Simulator)->Unit(benchmark::kMillisecond);
+BENCHMARK(CreateArbWaveform10M_PlainCopy)->Unit(benchmark::kMillisecond);
 BENCHMARK(ConfigureStandardWaveform_Direct);
 BENCHMARK(ConfigureStandardWaveform_ClassDriver);
 BENCHMARK(GetAttributeViReal64_Direct);

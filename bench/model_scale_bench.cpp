@@ -102,7 +102,8 @@ void BM_SnapshotAddAndLoad(benchmark::State& state) {
     state.SetComplexityN(state.range(0));
 }
 
-#define QZIVI_SCALE(bm) BENCHMARK(bm)->Arg(1000)->Arg(10000)->Arg(100000)->Unit(benchmark::kMillisecond)
+#define QZIVI_SCALE(bm)                                                                            \
+    BENCHMARK(bm)->Arg(1000)->Arg(10000)->Arg(100000)->Unit(benchmark::kMillisecond)
 QZIVI_SCALE(BM_AddWithDefaultNames);
 BENCHMARK(BM_ItemByName)->Arg(1000)->Arg(10000)->Arg(100000);
 QZIVI_SCALE(BM_SequenceBuildWriteRead);

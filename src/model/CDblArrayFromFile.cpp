@@ -217,14 +217,13 @@ std::optional<std::vector<double>> SmallFile(const std::string& block, std::size
 // The block path. The text of each round is the tail of the last one and the next block, which in
 // the file are one run of bytes: [textStart, blockEnd). Bytes past the end of the file are NUL.
 std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char delimiter,
-                              std::int32_t startIndex, std::int32_t interval, std::int32_t count) {
+                              std::int32_t startIndex, std::int32_t interval, std::int32_t count,
+                              std::uint64_t estimate) {
     const std::uint64_t length = file.Size();
     const std::uint64_t limit =
         count == -1 ? length : static_cast<std::uint64_t>(std::max(count, 0));
     std::vector<double> result;
-    // Room for as many points as the file could hold; pages that are never written cost nothing.
-    result.reserve(static_cast<std::size_t>(
-        count == -1 ? length / 2 + 1 : std::min<std::uint64_t>(limit, length / 2 + 1)));
+    result.reserve(static_cast<std::size_t>(std::min(limit, estimate)));
 
     std::vector<char> buffer(kReadSize + 2 * CDblArrayFromFile::kBlockSize);
     std::uint64_t bufferStart = 0, bufferEnd = 0; // file offsets held in the buffer
@@ -277,8 +276,18 @@ std::vector<double> ReadText(const std::string& filename, std::int32_t startInde
         const std::size_t firstDigit = block.find_first_of("0123456789");
         // A step of 0 or below, or a start before the first token, reads nothing on either path.
         if (interval <= 0 || startIndex < 0) return {};
-        if (file.Size() > CDblArrayFromFile::kBlockSize)
-            return BlockPath(file, firstDigit, delimiter[0], startIndex, interval, count);
+        if (file.Size() > CDblArrayFromFile::kBlockSize) {
+            // The points of the whole file at the density of its first block, and a tenth more.
+            const auto tokens = static_cast<std::uint64_t>(
+                std::count(block.begin() +
+                               static_cast<std::ptrdiff_t>(std::min(firstDigit, block.size())),
+                           block.end(), delimiter[0]) +
+                1);
+            const std::uint64_t estimate = file.Size() / CDblArrayFromFile::kBlockSize * tokens /
+                                               static_cast<std::uint64_t>(interval) * 11 / 10 +
+                                           tokens;
+            return BlockPath(file, firstDigit, delimiter[0], startIndex, interval, count, estimate);
+        }
         small = SmallFile(block, firstDigit, delimiter[0], startIndex, interval, count);
     } catch (...) {
         return {};

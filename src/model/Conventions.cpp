@@ -21,15 +21,22 @@ std::string JoinPath(std::string_view parent, std::string_view own) {
 
 std::string NewUniqueId() {
     // Seeded from the clock each time, as the ids were first drawn; the counter keeps two ids
-    // drawn within one clock tick apart.
+    // drawn within one clock tick apart. SplitMix64 steps: a tree of many thousand objects
+    // draws as many ids, so each must be cheap.
     static std::uint64_t counter = 0;
-    const auto ticks = static_cast<std::uint64_t>(
-        std::chrono::high_resolution_clock::now().time_since_epoch().count());
-    std::mt19937_64 generator(ticks ^ (++counter * 0x9E3779B97F4A7C15ull));
-    std::uniform_real_distribution<double> uniform(0.0, 1.0);
+    std::uint64_t state =
+        static_cast<std::uint64_t>(
+            std::chrono::high_resolution_clock::now().time_since_epoch().count()) ^
+        (++counter * 0x9E3779B97F4A7C15ull);
     std::string id(64, '0');
-    for (char& c : id)
-        c = static_cast<char>(48 + std::lround(uniform(generator) * 74));
+    for (char& c : id) {
+        std::uint64_t z = (state += 0x9E3779B97F4A7C15ull);
+        z = (z ^ (z >> 30)) * 0xBF58476D1CE4E5B9ull;
+        z = (z ^ (z >> 27)) * 0x94D049BB133111EBull;
+        z ^= z >> 31;
+        const double uniform = static_cast<double>(z >> 11) * 0x1.0p-53;
+        c = static_cast<char>(48 + std::lround(uniform * 74));
+    }
     return id;
 }
 

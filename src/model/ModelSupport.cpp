@@ -41,16 +41,24 @@ std::int32_t ReadInstrumentLimit(CIviErrorReport& err, const std::string& source
 
 namespace qzivi {
 
-std::int64_t DefaultNumberOf(std::string_view folded, std::string_view foldedBase) {
-    if (folded.size() <= foldedBase.size() || folded.size() > foldedBase.size() + 10 ||
-        folded.substr(0, foldedBase.size()) != foldedBase || folded[foldedBase.size()] == '0')
+std::int64_t DefaultNumberOf(std::string_view name, std::string_view base) {
+    if (name.size() <= base.size() || name.size() > base.size() + 10 ||
+        !text::EqualsNoCase(name.substr(0, base.size()), base) || name[base.size()] == '0')
         return 0;
     std::int64_t n = 0;
-    for (const char c : folded.substr(foldedBase.size())) {
+    for (const char c : name.substr(base.size())) {
         if (c < '0' || c > '9') return 0;
         n = n * 10 + (c - '0');
     }
     return n <= 2147483647 ? n : 0;
+}
+
+std::size_t NoCaseHash::operator()(std::string_view text) const {
+    std::size_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
+    for (const char c : text)
+        hash = (hash ^ static_cast<unsigned char>(c >= 'A' && c <= 'Z' ? c + 32 : c)) *
+               1099511628211ull;
+    return hash;
 }
 
 } // namespace qzivi

@@ -87,11 +87,14 @@ private:
 
 } // namespace
 
-SharedBytes::SharedBytes(Bytes bytes)
-    : owner_(std::make_shared<const Bytes>(std::move(bytes))), offset_(0), size_(owner_->size()) {}
+SharedBytes::SharedBytes(Bytes bytes) {
+    auto owner = std::make_shared<const Bytes>(std::move(bytes));
+    size_ = owner->size();
+    data_ = std::shared_ptr<const std::uint8_t>(owner, owner->data());
+}
 
 SharedBytes::SharedBytes(std::shared_ptr<const Bytes> owner, std::size_t offset, std::size_t size)
-    : owner_(std::move(owner)), offset_(offset), size_(size) {}
+    : data_(owner, owner->data() + offset), size_(size) {}
 
 bool operator==(const SharedBytes& a, const SharedBytes& b) {
     return a.size_ == b.size_ && (a.size_ == 0 || std::memcmp(a.data(), b.data(), a.size_) == 0);
@@ -101,49 +104,79 @@ namespace {
 char Fold(char c) {
     return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
 }
-} // namespace
-
-std::size_t PropertyBag::NoCaseHash::operator()(std::string_view name) const {
-    std::size_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
-    for (const char c : name)
-        hash = (hash ^ static_cast<unsigned char>(Fold(c))) * 1099511628211ull;
-    return hash;
-}
-
-bool PropertyBag::NoCaseEqual::operator()(std::string_view a, std::string_view b) const {
+bool SameName(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
     for (std::size_t i = 0; i < a.size(); ++i)
         if (Fold(a[i]) != Fold(b[i])) return false;
     return true;
 }
+} // namespace
+
+std::uint64_t PropertyBag::Hash(std::string_view name) {
+    std::uint64_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
+    for (const char c : name)
+        hash = (hash ^ static_cast<unsigned char>(Fold(c))) * 1099511628211ull;
+    return hash ^ (hash >> 29);
+}
+
+std::size_t PropertyBag::Probe(std::string_view name, std::uint64_t hash) const {
+    const std::size_t mask = index_.size() - 1;
+    for (std::size_t i = hash & mask;; i = (i + 1) & mask) {
+        const Slot& slot = index_[i];
+        if (slot.entry == 0) return i;
+        if (slot.hash == hash && SameName(entries_[slot.entry - 1].name, name)) return i;
+    }
+}
+
+void PropertyBag::Reindex(std::size_t capacity) {
+    index_.assign(capacity, Slot{});
+    for (std::size_t i = 0; i < entries_.size(); ++i) {
+        if (entries_[i].name.empty()) continue;
+        const std::uint64_t hash = Hash(entries_[i].name);
+        index_[Probe(entries_[i].name, hash)] = {hash, static_cast<std::uint32_t>(i + 1)};
+    }
+}
 
 const PropertyBag::Value* PropertyBag::Find(std::string_view name) const {
-    const auto found = index_.find(name);
-    return found == index_.end() ? nullptr : &entries_[found->second].value;
+    if (index_.empty()) return nullptr;
+    const Slot& slot = index_[Probe(name, Hash(name))];
+    return slot.entry == 0 ? nullptr : &entries_[slot.entry - 1].value;
 }
 
 void PropertyBag::Store(std::string_view name, Value value) {
-    const auto found = index_.find(name);
-    if (found != index_.end()) {
-        entries_[found->second].value = std::move(value);
+    if (2 * (entries_.size() + 1) > index_.size())
+        Reindex(std::max<std::size_t>(16, 2 * index_.size()));
+    const std::uint64_t hash = Hash(name);
+    Slot& slot = index_[Probe(name, hash)];
+    if (slot.entry != 0) {
+        entries_[slot.entry - 1].value = std::move(value);
         return;
     }
-    index_.emplace(std::string(name), entries_.size());
     entries_.push_back({std::string(name), std::move(value)});
+    slot = {hash, static_cast<std::uint32_t>(entries_.size())};
 }
 
 void PropertyBag::Remove(std::string_view name) {
-    const auto found = index_.find(name);
-    if (found == index_.end()) return;
-    Entry& entry = entries_[found->second];
+    if (index_.empty()) return;
+    const std::size_t mask = index_.size() - 1;
+    std::size_t hole = Probe(name, Hash(name));
+    if (index_[hole].entry == 0) return;
+    Entry& entry = entries_[index_[hole].entry - 1];
     entry.name.clear();
     entry.value = Value();
-    index_.erase(found);
+    // Close the hole: later slots of the same run that belong at or before it move up.
+    for (std::size_t i = (hole + 1) & mask; index_[i].entry != 0; i = (i + 1) & mask) {
+        const std::size_t home = index_[i].hash & mask;
+        if (((i - home) & mask) >= ((i - hole) & mask)) {
+            index_[hole] = index_[i];
+            hole = i;
+        }
+    }
+    index_[hole] = Slot{};
     if (2 * ++removed_ <= entries_.size()) return;
     std::erase_if(entries_, [](const Entry& e) { return e.name.empty(); });
     removed_ = 0;
-    for (std::size_t i = 0; i < entries_.size(); ++i)
-        index_.find(entries_[i].name)->second = i;
+    Reindex(index_.size());
 }
 
 std::vector<std::string> PropertyBag::Names() const {
@@ -293,6 +326,7 @@ void PropertyBag::SetContents(const SharedBytes& shared) {
         r.Corrupt(std::to_string(count) + " entries cannot fit in what remains");
     PropertyBag bag;
     bag.entries_.reserve(count);
+    bag.Reindex(std::bit_ceil(2 * std::size_t{count} + 16));
     for (std::uint32_t i = 0; i < count; ++i) {
         const auto nameLength = r.Get<std::uint16_t>("a name length");
         if (nameLength == 0) r.Corrupt("an entry has an empty name");

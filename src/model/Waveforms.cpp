@@ -210,9 +210,8 @@ void QZIviFgenArbWaveform::WriteProperties(PropertyBag& bag, const std::string& 
     }
     const std::size_t size = points->size() * sizeof(double);
     bag.WriteInt32(p + "ByteSize", static_cast<std::int32_t>(size), 0);
-    Bytes bytes(size);
-    std::memcpy(bytes.data(), points->data(), size);
-    bag.WriteBytes(p + "Data", std::move(bytes));
+    // The bag shares the points (they never change once made): a snapshot copies them once.
+    bag.WriteBytes(p + "Data", SharedBytes::Alias(points, points->data(), size));
 }
 
 void QZIviFgenArbWaveform::Clone(QZIviFgenArbWaveform& target) {

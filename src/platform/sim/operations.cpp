@@ -111,10 +111,19 @@ ViInt32 Instrument::CreateArbWaveform(ViInt32 size, const double* data) {
                 std::to_string(limits.waveformQuantum));
     if (data == nullptr)
         throw StatusError(IVI_ERROR_NULL_POINTER, "the waveform data is a null pointer");
-    for (ViInt32 k = 0; k < size; ++k)
-        if (!(data[k] >= -1.0 && data[k] <= 1.0))
-            Invalid("waveform point " + std::to_string(k) + " is " + Number(data[k]) +
-                    ", outside the range -1 to 1");
+    // The range check rides on the copy: one pass over a large download.
+    Samples points(static_cast<std::size_t>(size));
+    bool inRange = true;
+    for (ViInt32 k = 0; k < size; ++k) {
+        const double x = data[k];
+        inRange &= (x >= -1.0) & (x <= 1.0);
+        points[static_cast<std::size_t>(k)] = x;
+    }
+    if (!inRange)
+        for (ViInt32 k = 0; k < size; ++k)
+            if (!(data[k] >= -1.0 && data[k] <= 1.0))
+                Invalid("waveform point " + std::to_string(k) + " is " + Number(data[k]) +
+                        ", outside the range -1 to 1");
     if (static_cast<ViInt32>(waveforms_.size()) >= limits.maxWaveforms)
         throw StatusError(IVIFGEN_ERROR_NO_WFMS_AVAILABLE, "all " +
                                                                std::to_string(limits.maxWaveforms) +
@@ -125,7 +134,7 @@ ViInt32 Instrument::CreateArbWaveform(ViInt32 size, const double* data) {
                               std::to_string(limits.memoryPoints - usedPoints_) + " of " +
                               std::to_string(limits.memoryPoints) + " are free");
     const ViInt32 handle = nextWaveform_++;
-    waveforms_.emplace(handle, std::vector<double>(data, data + size));
+    waveforms_.emplace(handle, std::move(points));
     usedPoints_ += size;
     return handle;
 }

@@ -5,6 +5,8 @@
 #include "IviFgen.h"
 
 #include <map>
+#include <memory>
+#include <utility>
 #include <vector>
 
 namespace qzivi::sim {
@@ -52,11 +54,26 @@ struct GlobalState {
     InternalSource fm{100, IVIFGEN_VAL_WFM_SINE, 10};
 };
 
+// Room for points that are written right after they are made: no zeroing pass first.
+template <typename T>
+struct Uninitialized : std::allocator<T> {
+    using std::allocator<T>::allocator;
+    template <typename U>
+    void construct(U* p) noexcept {
+        ::new (static_cast<void*>(p)) U;
+    }
+    template <typename U, typename... Args>
+    void construct(U* p, Args&&... args) {
+        ::new (static_cast<void*>(p)) U(std::forward<Args>(args)...);
+    }
+};
+using Samples = std::vector<double, Uninitialized<double>>;
+
 struct StoredSequence {
     std::vector<ViInt32> handles;
     std::vector<ViInt32> loopCounts;
 };
-using WaveformMemory = std::map<ViInt32, std::vector<double>>;
+using WaveformMemory = std::map<ViInt32, Samples>;
 using SequenceMemory = std::map<ViInt32, StoredSequence>;
 
 // Everything the output of one channel depends on.

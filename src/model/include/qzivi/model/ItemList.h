@@ -92,9 +92,21 @@ private:
     std::int64_t m_nTop = 1;
 };
 
-// N if `folded` (a lower-case name) is `base` followed by N from 1 to 2147483647 in plain digits,
+// N if `name` is `base` (both ignoring case) followed by N from 1 to 2147483647 in plain digits,
 // as default names are made; 0 otherwise.
-std::int64_t DefaultNumberOf(std::string_view folded, std::string_view foldedBase);
+std::int64_t DefaultNumberOf(std::string_view name, std::string_view base);
+
+// Texts hashed and compared ignoring case, looked up without a copy.
+struct NoCaseHash {
+    using is_transparent = void;
+    std::size_t operator()(std::string_view text) const;
+};
+struct NoCaseEqual {
+    using is_transparent = void;
+    bool operator()(std::string_view a, std::string_view b) const {
+        return text::EqualsNoCase(a, b);
+    }
+};
 
 template <typename T>
 class ItemList {
@@ -102,7 +114,7 @@ public:
     using Ptr = std::shared_ptr<T>;
 
     // `base` is the word of default names ("Waveform"); empty for a list without names.
-    explicit ItemList(std::string_view base = {}) : m_sBase(text::Lower(base)) {}
+    explicit ItemList(std::string_view base = {}) : m_sBase(base) {}
     ~ItemList() { Clear(); }
     ItemList(const ItemList&) = delete;
     ItemList& operator=(const ItemList&) = delete;
@@ -166,15 +178,14 @@ public:
         m_nGapBegin = m_nGapEnd = 0;
         m_oByName.clear();
         m_oUniqueIds.clear();
+        m_bUniqueIds = false;
         m_oNumbers.Clear();
     }
 
     // ---- Names (for members that have them) ----
     // The first member whose name equals `name`, ignoring case; null if none.
-    Ptr FindName(const std::string& name) const
-        requires NamedMember<T>
-    {
-        const auto bucket = m_oByName.find(text::Lower(name));
+    Ptr FindName(const std::string& name) const requires NamedMember<T> {
+        const auto bucket = m_oByName.find(std::string_view(name));
         if (bucket == m_oByName.end()) return nullptr;
         const T* first = nullptr;
         for (const T* item : bucket->second)
@@ -182,10 +193,8 @@ public:
         return first ? At(IndexOfObject(first)) : nullptr;
     }
     // The position of the first member whose name equals `name` exactly; -1 if none.
-    std::int32_t IndexOfName(const std::string& name) const
-        requires NamedMember<T>
-    {
-        const auto bucket = m_oByName.find(text::Lower(name));
+    std::int32_t IndexOfName(const std::string& name) const requires NamedMember<T> {
+        const auto bucket = m_oByName.find(std::string_view(name));
         std::int32_t position = -1;
         if (bucket != m_oByName.end())
             for (const T* item : bucket->second)
@@ -196,30 +205,29 @@ public:
         return position;
     }
     // The members whose names equal `name`, ignoring case, in no order.
-    const std::vector<T*>& Named(const std::string& name) const
-        requires NamedMember<T>
-    {
+    const std::vector<T*>& Named(const std::string& name) const requires NamedMember<T> {
         static const std::vector<T*> none;
-        const auto bucket = m_oByName.find(text::Lower(name));
+        const auto bucket = m_oByName.find(std::string_view(name));
         return bucket == m_oByName.end() ? none : bucket->second;
     }
-    bool ContainsUniqueId(const std::string& uniqueId) const
-        requires NamedMember<T>
-    {
-        return m_oUniqueIds.contains(text::Lower(uniqueId));
+    // Asked only of objects of another copy of the tree, so the index is made at the first
+    // question and kept from then on.
+    bool ContainsUniqueId(const std::string& uniqueId) const requires NamedMember<T> {
+        if (!m_bUniqueIds) {
+            for (const auto& item : *this)
+                ++m_oUniqueIds[item->UniqueId()];
+            m_bUniqueIds = true;
+        }
+        return m_oUniqueIds.find(std::string_view(uniqueId)) != m_oUniqueIds.end();
     }
     // The base followed by the lowest number from 1 up that no member's name, ignoring case, has.
-    std::string DefaultName(std::string_view base)
-        requires NamedMember<T>
-    {
+    std::string DefaultName(std::string_view base) const requires NamedMember<T> {
         return std::string(base) + std::to_string(m_oNumbers.LowestFree());
     }
 
     // Position by a tagged index for Item: a number (not a text) is a position, anything else a
     // name; null when neither finds one.
-    Ptr Lookup(const Variant& index) const
-        requires NamedMember<T>
-    {
+    Ptr Lookup(const Variant& index) const requires NamedMember<T> {
         if (index.IsNumber()) {
             const std::int32_t position = index.AsInt32();
             return Has(position) ? At(position) : nullptr;
@@ -228,9 +236,7 @@ public:
     }
     // Position by a tagged index for Remove: a numeric value (a numeric text too) is a position,
     // anything else the first name that equals it; 0 when nothing fits.
-    std::int32_t RemovalPosition(const Variant& index) const
-        requires NamedMember<T>
-    {
+    std::int32_t RemovalPosition(const Variant& index) const requires NamedMember<T> {
         std::int32_t position = 0;
         if (index.IsNumeric())
             position = index.AsInt32();
@@ -291,7 +297,7 @@ private:
     void Learn(T& item) {
         if constexpr (NamedMember<T>) {
             AddName(item, item.Name());
-            ++m_oUniqueIds[text::Lower(item.UniqueId())];
+            if (m_bUniqueIds) ++m_oUniqueIds[item.UniqueId()];
         }
     }
     void Forget(T& item) {
@@ -302,14 +308,14 @@ private:
         }
     }
     void AddName(T& item, const std::string& name) {
-        std::string folded = text::Lower(name);
-        if (const auto n = DefaultNumberOf(folded, m_sBase)) m_oNumbers.Use(n);
-        m_oByName[std::move(folded)].push_back(&item);
+        if (const auto n = DefaultNumberOf(name, m_sBase)) m_oNumbers.Use(n);
+        auto bucket = m_oByName.find(std::string_view(name));
+        if (bucket == m_oByName.end()) bucket = m_oByName.emplace(name, std::vector<T*>()).first;
+        bucket->second.push_back(&item);
     }
     void DropName(T& item, const std::string& name) {
-        const std::string folded = text::Lower(name);
-        if (const auto n = DefaultNumberOf(folded, m_sBase)) m_oNumbers.Release(n);
-        const auto bucket = m_oByName.find(folded);
+        if (const auto n = DefaultNumberOf(name, m_sBase)) m_oNumbers.Release(n);
+        const auto bucket = m_oByName.find(std::string_view(name));
         if (bucket == m_oByName.end()) return;
         auto& items = bucket->second;
         for (auto& entry : items)
@@ -321,7 +327,8 @@ private:
         if (items.empty()) m_oByName.erase(bucket);
     }
     void DropUniqueId(const std::string& uniqueId) {
-        const auto found = m_oUniqueIds.find(text::Lower(uniqueId));
+        if (!m_bUniqueIds) return;
+        const auto found = m_oUniqueIds.find(std::string_view(uniqueId));
         if (found != m_oUniqueIds.end() && --found->second == 0) m_oUniqueIds.erase(found);
     }
     void Rename(T& item, const std::string& before) {
@@ -329,16 +336,20 @@ private:
         AddName(item, item.Name());
     }
     void ChangeUniqueId(T& item, const std::string& before) {
+        if (!m_bUniqueIds) return;
         DropUniqueId(before);
-        ++m_oUniqueIds[text::Lower(item.UniqueId())];
+        ++m_oUniqueIds[item.UniqueId()];
     }
 
     std::vector<Ptr> m_oSlots;
     std::size_t m_nGapBegin = 0, m_nGapEnd = 0;
     std::string m_sBase;
-    std::unordered_map<std::string, std::vector<T*>> m_oByName;   // folded name -> members
-    std::unordered_map<std::string, std::int32_t> m_oUniqueIds; // folded id -> members
-    DefaultNumbers m_oNumbers;
+    // A name, ignoring case -> the members of that name.
+    std::unordered_map<std::string, std::vector<T*>, NoCaseHash, NoCaseEqual> m_oByName;
+    // A unique id, ignoring case -> how many members have it; made at the first question.
+    mutable std::unordered_map<std::string, std::int32_t, NoCaseHash, NoCaseEqual> m_oUniqueIds;
+    mutable bool m_bUniqueIds = false;
+    mutable DefaultNumbers m_oNumbers;
 };
 
 } // namespace qzivi

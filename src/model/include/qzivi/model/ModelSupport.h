@@ -112,7 +112,7 @@ public:
     }
     std::int32_t IndexOfObject(const Item* object) const { return m_oItems.IndexOfObject(object); }
     std::int32_t IndexOfName(const std::string& name) const { return m_oItems.IndexOfName(name); }
-    std::string DefaultName() { return m_oItems.DefaultName(itemWord_); }
+    std::string DefaultName() const { return m_oItems.DefaultName(itemWord_); }
     // The members named `name`, ignoring case.
     const std::vector<Item*>& Named(const std::string& name) const { return m_oItems.Named(name); }
     bool Holds(const Item& object) const { return m_oItems.Holds(object); }

@@ -17,7 +17,6 @@
 #include <span>
 #include <string>
 #include <string_view>
-#include <unordered_map>
 #include <variant>
 #include <vector>
 
@@ -32,21 +31,29 @@ public:
     SharedBytes() = default;
     explicit SharedBytes(Bytes bytes);
     SharedBytes(std::shared_ptr<const Bytes> owner, std::size_t offset, std::size_t size);
+    // Bytes that another shared object holds (the points of a waveform), kept alive by it.
+    template <typename Owner>
+    static SharedBytes Alias(std::shared_ptr<Owner> owner, const void* data, std::size_t size) {
+        SharedBytes bytes;
+        bytes.data_ = std::shared_ptr<const std::uint8_t>(std::move(owner),
+                                                          static_cast<const std::uint8_t*>(data));
+        bytes.size_ = size;
+        return bytes;
+    }
 
-    const std::uint8_t* data() const { return owner_ ? owner_->data() + offset_ : nullptr; }
+    const std::uint8_t* data() const { return data_.get(); }
     std::size_t size() const { return size_; }
     bool empty() const { return size_ == 0; }
     std::span<const std::uint8_t> span() const { return {data(), size_}; }
     Bytes ToBytes() const { return Bytes(data(), data() + size_); }
     // The same run, narrowed.
     SharedBytes Slice(std::size_t offset, std::size_t size) const {
-        return {owner_, offset_ + offset, size};
+        return Alias(data_, data() + offset, size);
     }
     friend bool operator==(const SharedBytes& a, const SharedBytes& b);
 
 private:
-    std::shared_ptr<const Bytes> owner_;
-    std::size_t offset_ = 0;
+    std::shared_ptr<const std::uint8_t> data_; // points into the object that owns the bytes
     std::size_t size_ = 0;
 };
 
@@ -95,15 +102,16 @@ private:
         std::string name; // empty once removed
         Value value;
     };
-    // Names compared and hashed ignoring case, looked up without a copy.
-    struct NoCaseHash {
-        using is_transparent = void;
-        std::size_t operator()(std::string_view name) const;
+    // The index of names, ignoring case: an open-addressed table of the names' hashes and their
+    // entries, so that a lookup touches one slot and, on a hit, one name.
+    struct Slot {
+        std::uint64_t hash = 0;
+        std::uint32_t entry = 0; // entry + 1; 0 for a free slot
     };
-    struct NoCaseEqual {
-        using is_transparent = void;
-        bool operator()(std::string_view a, std::string_view b) const;
-    };
+    static std::uint64_t Hash(std::string_view name);
+    // The slot of `name`, or the free slot where it would go.
+    std::size_t Probe(std::string_view name, std::uint64_t hash) const;
+    void Reindex(std::size_t capacity);
     const Value* Find(std::string_view name) const;
     void Store(std::string_view name, Value value);
     // Leaves a hole in the order, closed once holes are half the entries: O(1) amortized.
@@ -116,7 +124,7 @@ private:
 
     std::vector<Entry> entries_;
     std::size_t removed_ = 0;
-    std::unordered_map<std::string, std::size_t, NoCaseHash, NoCaseEqual> index_; // -> entry
+    std::vector<Slot> index_; // a power of two, at most half full
 };
 
 } // namespace qzivi
