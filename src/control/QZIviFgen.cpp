@@ -90,6 +90,138 @@ void QZIviFgen::FinishLoad() {
         SetDisplayName(m_oHost ? m_oHost->DisplayName() : std::string());
     } catch (...) {
     }
+    try {
+        SetUiStyle(m_oProp->UIStyle());
+    } catch (...) {
+    }
+    ArmAutoConfigure();
+}
+
+// ---- Panel hosting -----------------------------------------------------------------------------
+
+namespace {
+// A step whose failures are ignored, as the host's notices and the panel swap require.
+template <typename F>
+void Quietly(F&& step) {
+    try {
+        step();
+    } catch (...) {
+    }
+}
+
+std::int32_t Whole(float value) {
+    return static_cast<std::int32_t>(value);
+}
+} // namespace
+
+void QZIviFgen::SetUiStyle(std::int32_t style) {
+    if (style == m_oStyle.lastStyle && style >= 0 && m_oStyle.applied) return;
+    Quietly([&] {
+        if (m_oUI) m_oStyle.savedState = m_oUI->UiState();
+    });
+    m_oUI.reset();
+    Quietly([&] {
+        if (m_oHost) m_oHost->RemoveChild("UI");
+    });
+    const bool userMode = m_oHost && m_oHost->UserMode();
+    if (m_oHost && (!userMode || style != qzivifgenInvisibleAtRuntime)) {
+        const std::string className = style == qzivifgenInvisibleAtRuntime
+                                          ? "QZIviFgenLib.XUILess"
+                                          : "QZIviFgenLib.XUIFgen" + std::to_string(style);
+        m_oUI = m_oHost->AddChild(className, "UI");
+        if (m_oUI) m_oUI->Construct(m_oIO.get(), m_oProp, m_oErr);
+    }
+    if (!m_oUI) {
+        if (m_oHost) {
+            m_oHost->SetSize(0, 0);
+            Quietly([&] {
+                m_oStyle.wasVisible = m_oHost->FormEntryVisible() && userMode;
+                m_oHost->SetFormEntryVisible(!userMode);
+            });
+        }
+    } else {
+        ShowPanelState(m_oStyle.savedState);
+        if (m_oStyle.lastStyle != qzivifgenInvisibleAtRuntime || !m_oStyle.applied) {
+            m_oStyle.savedWidth = Whole(m_oHost->Width());
+            m_oStyle.savedHeight = Whole(m_oHost->Height());
+        } else {
+            // Back from the invisible style: the size and visibility of before.
+            if (m_oStyle.savedWidth >= 1 || m_oStyle.savedHeight >= 1)
+                m_oHost->SetSize(static_cast<float>(m_oStyle.savedWidth),
+                                 static_cast<float>(m_oStyle.savedHeight));
+            Quietly([&] {
+                if (m_oStyle.wasVisible) m_oHost->SetFormEntryVisible(true);
+            });
+        }
+        Resized();
+        m_oUI->Visible(true);
+    }
+    m_oStyle.lastStyle = style;
+    m_oStyle.applied = true;
+}
+
+void QZIviFgen::ShowPanelState(std::int32_t state) {
+    const bool userMode = m_oHost && m_oHost->UserMode();
+    m_oUI->UiState(userMode ? state & ~1 : state | 1);
+    m_oUI->Enabled(m_oProp->Enabled());
+    m_oUI->Move(0, 0);
+}
+
+void QZIviFgen::Resized() {
+    if (m_bResizing || !m_oUI || !m_oHost) return;
+    m_bResizing = true;
+    Quietly([&] {
+        m_oUI->Size(m_oHost->Width(), m_oHost->Height());
+        m_oHost->SetSize(m_oUI->Width(), m_oUI->Height());
+    });
+    m_bResizing = false;
+}
+
+void QZIviFgen::RefreshPanel() {
+    std::int32_t state = 0;
+    Quietly([&] {
+        if (m_oUI) state = m_oUI->UiState();
+    });
+    if (!m_oUI) {
+        if (!m_oHost) return;
+        Quietly([&] {
+            m_oHost->SetSize(0, 0);
+            m_oHost->SetFormEntryVisible(!m_oHost->UserMode());
+        });
+        return;
+    }
+    Quietly([&] { ShowPanelState(state); });
+    Resized();
+}
+
+void QZIviFgen::GotFocus() {
+    Quietly([&] {
+        if (m_oHost && m_oHost->UserMode() && !m_oUI) m_oHost->SendTab();
+    });
+}
+
+void QZIviFgen::ArmAutoConfigure() {
+    try {
+        if (m_oProp->AutoConfigure() && m_oHost && m_oHost->UserMode()) {
+            m_oAutoConfigHack = CTimer::Create();
+            m_cAutoConfigTick = m_oAutoConfigHack->Timer.Connect([this] { AutoConfigureTick(); });
+            m_oAutoConfigHack->OneShot(1);
+        }
+    } catch (...) {
+        HandleError("AutoConfigure", 0, m_oErr.get());
+    }
+}
+
+// The host's own load code has run: now the instrument is configured, and whatever fails is
+// reported without a raise.
+void QZIviFgen::AutoConfigureTick() {
+    try {
+        m_oIO->Configure(false);
+    } catch (...) {
+        HandleError("AutoConfigure", 0, m_oErr.get());
+    }
+    m_cAutoConfigTick.Disconnect();
+    m_oAutoConfigHack.reset();
 }
 
 void QZIviFgen::AmbientChanged(const std::string& name) {
@@ -165,7 +297,10 @@ std::int32_t QZIviFgen::UIStyle() {
     return Frame("UIStyle", [&] { return m_oProp->UIStyle(); });
 }
 void QZIviFgen::UIStyle(std::int32_t value) {
-    Frame("UIStyle", [&] { m_oProp->UIStyle(value); });
+    Frame("UIStyle", [&] {
+        m_oProp->UIStyle(value);
+        SetUiStyle(value);
+    });
 }
 
 bool QZIviFgen::Enabled() {

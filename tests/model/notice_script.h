@@ -16,12 +16,12 @@ namespace qzivi::test {
 inline std::vector<std::string> RunNoticeScript(const std::shared_ptr<CIviFgenPropImp>& tree,
                                                 int n) {
     std::vector<std::string> lines;
-    auto connection = tree->CollectionChanged.Connect(
-        [&](const std::string& name, const Variant&, std::int32_t kind, const Variant& first,
-            const Variant& second) {
-            lines.push_back(name + " " + std::to_string(kind) + " " + first.AsText() + " " +
-                            second.AsText());
-        });
+    auto connection = tree->CollectionChanged.Connect([&](const std::string& name, const Variant&,
+                                                          std::int32_t kind, const Variant& first,
+                                                          const Variant& second) {
+        lines.push_back(name + " " + std::to_string(kind) + " " + first.AsText() + " " +
+                        second.AsText());
+    });
     std::uint32_t state = 12345;
     auto next = [&](std::uint32_t below) {
         state = state * 1664525u + 1013904223u;

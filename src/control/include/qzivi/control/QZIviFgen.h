@@ -7,6 +7,7 @@
 #include "qzivi/engine/CIviFgenIOImp.h"
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/support/event.h"
+#include "qzivi/support/timers.h"
 
 #include <cstdint>
 #include <memory>
@@ -31,6 +32,10 @@ public:
     void ReadProperties(const PropertyBag& bag); // a stored instance
     void WriteProperties(PropertyBag& bag);
     void AmbientChanged(const std::string& name);
+    // The host resized the control: the panel has the last word on the size.
+    void Resized();
+    // The control got the input focus: at run time without a panel it moves the focus on.
+    void GotFocus();
 
     // ---- Methods ----
     void Init(bool DoIDQuery = false, bool DoReset = false, const std::string& OptionString = "",
@@ -82,6 +87,10 @@ public:
 
     // The engine, for the panels and pages that sit on this control.
     CIviFgenIOImp& Engine() { return *m_oIO; }
+    // The panel of the present style, if any.
+    const std::shared_ptr<IQZIviFgenPanel>& Panel() const { return m_oUI; }
+    // After an apply from the pages changed Enabled: the panel takes the state of the control.
+    void RefreshPanel();
 
 private:
     template <typename F>
@@ -89,6 +98,12 @@ private:
     void FinishLoad();
     void SetDisplayName(const std::string& name);
     void ConnectPropertySet();
+    // The only place where a panel is made or dropped.
+    void SetUiStyle(std::int32_t style);
+    // UiState with bit 0 ("design mode") from the host's mode, Enabled, the panel at 0, 0.
+    void ShowPanelState(std::int32_t state);
+    void ArmAutoConfigure();
+    void AutoConfigureTick();
 
     IQZIviFgenHost* m_oHost;
     std::unique_ptr<CIviFgenIOImp> m_oIO;
@@ -96,6 +111,17 @@ private:
     std::shared_ptr<CIviErrorReport> m_oErr;
     std::shared_ptr<IQZIviFgenPanel> m_oUI;
     std::string m_sDisplayName;
+    std::shared_ptr<CTimer> m_oAutoConfigHack;
+    Connection m_cAutoConfigTick;
+    // What SetUiStyle keeps from call to call.
+    struct StyleMemory {
+        std::int32_t lastStyle = 0;
+        bool applied = false;
+        bool wasVisible = false;
+        std::int32_t savedWidth = 0, savedHeight = 0;
+        std::int32_t savedState = 0;
+    } m_oStyle;
+    bool m_bResizing = false;
     Connection m_cPropertyChange;
     Connection m_cError;
     Connection m_cWarning;
