@@ -26,6 +26,8 @@ QZIviFgen::QZIviFgen(IQZIviFgenHost* host) : m_oHost(host) {
 }
 
 QZIviFgen::~QZIviFgen() {
+    m_cAutoConfigTick.Disconnect();
+    m_oAutoConfigHack.reset();
     try {
         if (m_oUI && m_oHost) m_oHost->RemoveChild("UI");
     } catch (...) {
