@@ -1,0 +1,108 @@
+// Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
+// of the folder given: grab_widgets docs/images
+#include "qzivi/widgets/QZButton.h"
+#include "qzivi/widgets/QZGraph.h"
+#include "qzivi/widgets/QZKnob.h"
+
+#include <QApplication>
+#include <QDir>
+#include <QHBoxLayout>
+#include <QPainter>
+#include <QPixmap>
+
+#include <cmath>
+#include <random>
+
+using namespace qzivi;
+
+namespace {
+
+void Save(QWidget& widget, const QString& folder, const QString& name) {
+    widget.ensurePolished();
+    for (const int ratio : {1, 2}) {
+        QPixmap pixmap(widget.size() * ratio);
+        pixmap.setDevicePixelRatio(ratio);
+        pixmap.fill(widget.palette().color(QPalette::Window));
+        widget.render(&pixmap);
+        pixmap.save(QDir(folder).filePath(QStringLiteral("%1@%2x.png").arg(name).arg(ratio)));
+    }
+}
+
+QIcon Shape(int kind) {
+    QPixmap pixmap(48, 24);
+    pixmap.fill(Qt::transparent);
+    QPainter p(&pixmap);
+    p.setRenderHint(QPainter::Antialiasing);
+    p.setPen(QPen(QColor(0xe8, 0xec, 0xf0), 2.2));
+    QPolygonF line;
+    for (int x = 2; x <= 46; ++x) {
+        const double t = (x - 2) / 44.0;
+        const double y = kind == 0 ? std::sin(2 * M_PI * t) : (t < 0.5 ? 1 : -1);
+        line << QPointF(x, 12 - 9 * y);
+    }
+    p.drawPolyline(line);
+    return QIcon(pixmap);
+}
+
+} // namespace
+
+int main(int argc, char** argv) {
+    QApplication app(argc, argv);
+    const QString folder = argc > 1 ? argv[1] : QStringLiteral(".");
+    QDir().mkpath(folder);
+
+    QWidget knobs;
+    knobs.setPalette(QPalette(QColor(0x2b, 0x2e, 0x33)));
+    knobs.setAutoFillBackground(true);
+    auto* row = new QHBoxLayout(&knobs);
+    const double values[] = {2.5e3, 7.5, -3};
+    const double ranges[][2] = {{1e-6, 10e3}, {0, 10}, {-5, 5}};
+    for (int i = 0; i < 3; ++i) {
+        auto* knob = new QZKnob(&knobs);
+        knob->setFixedSize(i == 0 ? 100 : 80, i == 0 ? 88 : 72);
+        knob->Minimum(ranges[i][0]);
+        knob->Maximum(ranges[i][1]);
+        knob->Value(values[i]);
+        row->addWidget(knob);
+    }
+    knobs.resize(320, 110);
+    Save(knobs, folder, "qzknob");
+
+    QWidget buttons;
+    buttons.setPalette(QPalette(QColor(0x2b, 0x2e, 0x33)));
+    buttons.setAutoFillBackground(true);
+    auto* line = new QHBoxLayout(&buttons);
+    for (int i = 0; i < 2; ++i) {
+        auto* button = new QZButton(&buttons);
+        button->setFixedSize(64, 38);
+        button->OnPicture(Shape(i));
+        button->OffPicture(Shape(i));
+        button->Value(i == 0);
+        line->addWidget(button);
+    }
+    buttons.resize(160, 56);
+    Save(buttons, folder, "qzbutton");
+
+    QZGraph sine;
+    sine.resize(420, 240);
+    std::vector<double> points(500);
+    for (std::size_t i = 0; i < points.size(); ++i)
+        points[i] = 15 * std::sin(2 * M_PI * static_cast<double>(i) / 250);
+    sine.XAxis().Maximum(499);
+    sine.PlotY(points);
+    Save(sine, folder, "qzgraph-sine");
+
+    QZGraph noise;
+    noise.resize(420, 240);
+    std::vector<double> big(10'000'000);
+    std::mt19937 random(1);
+    std::normal_distribution<double> gauss(0, 0.15);
+    for (std::size_t i = 0; i < big.size(); ++i)
+        big[i] = 0.5 * std::sin(2 * M_PI * static_cast<double>(i) / 2.5e6) + gauss(random);
+    noise.XAxis().Maximum(static_cast<double>(big.size() - 1));
+    noise.YAxis().Minimum(-1.5);
+    noise.YAxis().Maximum(1.5);
+    noise.PlotY(std::move(big));
+    Save(noise, folder, "qzgraph-noise-10M");
+    return 0;
+}
