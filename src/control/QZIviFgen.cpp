@@ -4,6 +4,7 @@
 #include "qzivi/control/Panel.h"
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/PropertyBag.h"
+#include "qzivi/support/failure.h"
 
 namespace qzivi {
 
@@ -299,20 +300,14 @@ std::int32_t QZIviFgen::UIStyle() {
     return Frame("UIStyle", [&] { return m_oProp->UIStyle(); });
 }
 void QZIviFgen::UIStyle(std::int32_t value) {
-    Frame("UIStyle", [&] {
-        m_oProp->UIStyle(value);
-        SetUiStyle(value);
-    });
+    Property("UIStyle", value);
 }
 
 bool QZIviFgen::Enabled() {
     return Frame("Enabled", [&] { return m_oProp->Enabled(); });
 }
 void QZIviFgen::Enabled(bool value) {
-    Frame("Enabled", [&] {
-        m_oProp->Enabled(value);
-        if (m_oUI) m_oUI->Enabled(value);
-    });
+    Property("Enabled", value);
 }
 
 bool QZIviFgen::AutoConfigure() {
@@ -375,6 +370,26 @@ bool QZIviFgen::ExceptionOnError() {
 }
 void QZIviFgen::ExceptionOnError(bool value) {
     Frame("ExceptionOnError", [&] { m_oProp->ExceptionOnError(value); });
+}
+
+namespace {
+const PropertyRow<CIviFgenPropImp>& RootRow(const std::string& name) {
+    for (const auto& row : CIviFgenPropImp::Properties())
+        if (row.name == name) return row;
+    RaiseRuntime(runtime::kWrongType, "The control has no property \"" + name + "\".");
+}
+} // namespace
+
+PropertyValue QZIviFgen::Property(const std::string& name) {
+    return Frame(name.c_str(), [&] { return RootRow(name).get(*m_oProp); });
+}
+
+void QZIviFgen::Property(const std::string& name, const PropertyValue& value) {
+    Frame(name.c_str(), [&] {
+        m_oProp->Put(RootRow(name), value);
+        if (name == "UIStyle") SetUiStyle(m_oProp->UIStyle());
+        if (name == "Enabled" && m_oUI) m_oUI->Enabled(m_oProp->Enabled());
+    });
 }
 
 std::int32_t QZIviFgen::SessionHandle() {

@@ -75,6 +75,10 @@ public:
     bool ExceptionOnError();
     void ExceptionOnError(bool value);
     std::int32_t SessionHandle();
+    // A value of the root by the name of its row, as a host with generic properties sets it;
+    // UIStyle and Enabled reach the panel as their own puts do.
+    PropertyValue Property(const std::string& name);
+    void Property(const std::string& name, const PropertyValue& value);
 
     // ---- Events ----
     Event<std::int32_t, const std::string&, const std::string&> IviError;

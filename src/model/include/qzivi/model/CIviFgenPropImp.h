@@ -82,6 +82,8 @@ public:
 
     // The ten values in the order of their notices and bag keys.
     static std::span<const PropertyRow<CIviFgenPropImp>> Properties();
+    // A value by its row, through its put: checked where the row checks, then noticed.
+    void Put(const PropertyRow<CIviFgenPropImp>& row, const PropertyValue& value);
 
 private:
     enum Row : std::size_t {
@@ -97,8 +99,6 @@ private:
         kExceptionOnError,
     };
     CIviFgenPropImp();
-    // Every put: the row stores (UIStyle checks first), then PropertyChange fires.
-    void Put(const PropertyRow<CIviFgenPropImp>& row, const PropertyValue& value);
     void Put(Row row, PropertyValue value) { Put(Properties()[row], value); }
     struct WithNotice {
         void operator()(CIviFgenPropImp& set, const PropertyRow<CIviFgenPropImp>& row,

@@ -282,16 +282,16 @@ private:
     // Doubles the room, keeping the gap where it is.
     void Grow() {
         const std::size_t size = Size();
-        std::vector<Ptr> slots(std::max<std::size_t>(16, 2 * size));
+        std::vector<Ptr> room(std::max<std::size_t>(16, 2 * size));
         const std::size_t tail = size - m_nGapBegin;
         for (std::size_t i = 0; i < m_nGapBegin; ++i)
-            slots[i] = std::move(m_oSlots[i]);
+            room[i] = std::move(m_oSlots[i]);
         for (std::size_t i = 0; i < tail; ++i) {
-            auto& moved = slots[slots.size() - tail + i] = std::move(m_oSlots[m_nGapEnd + i]);
-            moved->m_nSlot = slots.size() - tail + i;
+            auto& moved = room[room.size() - tail + i] = std::move(m_oSlots[m_nGapEnd + i]);
+            moved->m_nSlot = room.size() - tail + i;
         }
-        m_nGapEnd = slots.size() - tail;
-        m_oSlots = std::move(slots);
+        m_nGapEnd = room.size() - tail;
+        m_oSlots = std::move(room);
     }
 
     void Learn(T& item) {
