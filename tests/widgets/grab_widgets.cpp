@@ -1,5 +1,8 @@
 // Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
 // of the folder given: grab_widgets docs/images
+#include "qzivi/panels/Pictures.h"
+#include "qzivi/panels/XUILess.h"
+#include "qzivi/panels/XWinLabel.h"
 #include "qzivi/widgets/QZButton.h"
 #include "qzivi/widgets/QZGraph.h"
 #include "qzivi/widgets/QZKnob.h"
@@ -28,22 +31,6 @@ void Save(QWidget& widget, const QString& folder, const QString& name) {
     }
 }
 
-QIcon Shape(int kind) {
-    QPixmap pixmap(48, 24);
-    pixmap.fill(Qt::transparent);
-    QPainter p(&pixmap);
-    p.setRenderHint(QPainter::Antialiasing);
-    p.setPen(QPen(QColor(0xe8, 0xec, 0xf0), 2.2));
-    QPolygonF line;
-    for (int x = 2; x <= 46; ++x) {
-        const double t = (x - 2) / 44.0;
-        const double y = kind == 0 ? std::sin(2 * M_PI * t) : (t < 0.5 ? 1 : -1);
-        line << QPointF(x, 12 - 9 * y);
-    }
-    p.drawPolyline(line);
-    return QIcon(pixmap);
-}
-
 } // namespace
 
 int main(int argc, char** argv) {
@@ -68,20 +55,34 @@ int main(int argc, char** argv) {
     knobs.resize(320, 110);
     Save(knobs, folder, "qzknob");
 
+    // The eight function keys of the front panel, the sine pressed.
     QWidget buttons;
     buttons.setPalette(QPalette(QColor(0x2b, 0x2e, 0x33)));
     buttons.setAutoFillBackground(true);
     auto* line = new QHBoxLayout(&buttons);
-    for (int i = 0; i < 2; ++i) {
+    const int off[] = {5001, 5002, 5003, 5004, 5005, 5006, 5100, 5150};
+    const int onPictures[] = {5051, 5052, 5053, 5054, 5055, 5056, 5101, 5151};
+    for (int i = 0; i < 8; ++i) {
         auto* button = new QZButton(&buttons);
-        button->setFixedSize(64, 38);
-        button->OnPicture(Shape(i));
-        button->OffPicture(Shape(i));
+        button->setFixedSize(51, 31);
+        button->OffPicture(LoadPictureFromResource(off[i]));
+        button->OnPicture(LoadPictureFromResource(onPictures[i]));
         button->Value(i == 0);
         line->addWidget(button);
     }
-    buttons.resize(160, 56);
+    buttons.resize(480, 52);
     Save(buttons, folder, "qzbutton");
+
+    QWidget labels;
+    auto* labelRow = new QHBoxLayout(&labels);
+    auto* label = new XWinLabel(&labels);
+    label->Caption("Frequency");
+    label->setFixedSize(90, 20);
+    auto* icon = new XUILess(&labels);
+    labelRow->addWidget(label);
+    labelRow->addWidget(icon);
+    labels.resize(150, 44);
+    Save(labels, folder, "xwinlabel-xuiless");
 
     QZGraph sine;
     sine.resize(420, 240);

@@ -79,29 +79,28 @@ void QZButton::paintEvent(QPaintEvent*) {
     const QRectF key = QRectF(rect()).adjusted(1.5, 1.5, -1.5, -1.5);
     const double radius = std::min(key.height(), key.width()) * 0.18;
 
-    // The key: raised when up, sunk when pressed; lit from within when on.
+    // The key: a light face, raised when up and sunk when pressed or on.
     QLinearGradient face(key.topLeft(), key.bottomLeft());
     const bool sunk = m_bDown || m_bValue;
-    if (m_bValue && on) {
-        face.setColorAt(0, QColor(0x2f, 0x5b, 0x7f));
-        face.setColorAt(1, QColor(0x1b, 0x3a, 0x55));
-    } else {
-        face.setColorAt(0, sunk ? QColor(0x3c, 0x40, 0x46) : QColor(0x5a, 0x60, 0x68));
-        face.setColorAt(1, sunk ? QColor(0x4c, 0x51, 0x58) : QColor(0x33, 0x36, 0x3b));
+    face.setColorAt(0, sunk ? QColor(0xb9, 0xbe, 0xc5) : QColor(0xf2, 0xf3, 0xf5));
+    face.setColorAt(1, sunk ? QColor(0xd3, 0xd7, 0xdc) : QColor(0xc8, 0xcc, 0xd2));
+    if (!on) {
+        face.setColorAt(0, QColor(0xd8, 0xd8, 0xd8));
+        face.setColorAt(1, QColor(0xcc, 0xcc, 0xcc));
     }
-    p.setPen(QPen(hasFocus() ? palette().color(QPalette::Highlight) : QColor(0x12, 0x13, 0x15),
-                  hasFocus() ? 1.8 : 1.2));
+    p.setPen(QPen(hasFocus() ? palette().color(QPalette::Highlight) : QColor(0x1a, 0x1c, 0x1f),
+                  hasFocus() ? 2.0 : 1.2));
     p.setBrush(face);
     p.drawRoundedRect(key, radius, radius);
-    if (m_bHover && on && !m_bValue) {
+    if (m_bHover && on && !sunk) {
         p.setPen(Qt::NoPen);
-        p.setBrush(QColor(255, 255, 255, 18));
+        p.setBrush(QColor(255, 255, 255, 60));
         p.drawRoundedRect(key, radius, radius);
     }
     // The lamp of a pressed function, along the top edge.
     const QRectF lamp(key.left() + key.width() * 0.3, key.top() + 2.5, key.width() * 0.4, 2.5);
     p.setPen(Qt::NoPen);
-    p.setBrush(m_bValue && on ? QColor(0x5c, 0xe1, 0xff) : QColor(0x25, 0x27, 0x2b));
+    p.setBrush(m_bValue && on ? QColor(0x22, 0xc5, 0x5e) : QColor(0x8d, 0x93, 0x9b));
     p.drawRoundedRect(lamp, 1, 1);
 
     const QIcon& picture = m_bValue ? m_oOnPicture : m_oOffPicture;
