@@ -182,12 +182,19 @@ void QZIviFgenWidget::SetPropertyBagContents(const QByteArray& contents) {
 }
 
 void QZIviFgenWidget::ShowAboutBox() {
-    const QString driver =
-        m_oControl->SessionHandle() != 0
-            ? tr("Logical name \"%1\", session %2")
-                  .arg(Q(m_oControl->LogicalName()))
-                  .arg(m_oControl->SessionHandle())
-            : tr("No session open (logical name \"%1\")").arg(Q(m_oControl->LogicalName()));
+    QString driver =
+        tr("No session is open; the logical name is \"%1\".").arg(Q(m_oControl->LogicalName()));
+    if (m_oControl->SessionHandle() != 0) try {
+            auto& engine = m_oControl->Engine();
+            const auto text = [&](ViAttr attribute) {
+                return Q(engine.GetAttributeVi(AttrType::String, attribute, "").AsText());
+            };
+            driver = tr("Logical name \"%1\": %2 (%3), %4.")
+                         .arg(Q(m_oControl->LogicalName()), text(IVI_ATTR_SPECIFIC_DRIVER_PREFIX),
+                              text(IVI_ATTR_SPECIFIC_DRIVER_DESCRIPTION),
+                              text(IVI_ATTR_INSTRUMENT_MODEL));
+        } catch (const Failure&) { // a driver that cannot tell: the name alone
+        }
     QMessageBox::about(this, tr("About QZIviFgen"),
                        tr("<b>QZIviFgen %1</b><p>An instrument control for function generators.</p>"
                           "<p>%2</p>")

@@ -3,6 +3,7 @@
 #include "qzivi/panels/Pictures.h"
 #include "qzivi/panels/XUILess.h"
 #include "qzivi/panels/XWinLabel.h"
+#include "qzivi/qt/QZIviFgenWidget.h"
 #include "qzivi/widgets/QZButton.h"
 #include "qzivi/widgets/QZGraph.h"
 #include "qzivi/widgets/QZKnob.h"
@@ -12,6 +13,7 @@
 #include <QHBoxLayout>
 #include <QPainter>
 #include <QPixmap>
+#include <QTimer>
 
 #include <cmath>
 #include <random>
@@ -105,5 +107,17 @@ int main(int argc, char** argv) {
     noise.YAxis().Maximum(1.5);
     noise.PlotY(std::move(big));
     Save(noise, folder, "qzgraph-noise-10M");
+
+    // The About box of a control with a session on the simulator, grabbed while it is open.
+    qputenv("QZIVI_SESSION_MANAGER", "none");
+    QZIviFgenWidget control;
+    control.Control().Init();
+    QTimer::singleShot(200, [&] {
+        if (QWidget* about = QApplication::activeModalWidget()) {
+            Save(*about, folder, "about-box");
+            about->close();
+        }
+    });
+    control.Control().AboutBox();
     return 0;
 }
