@@ -31,6 +31,18 @@ std::int32_t Proportional(std::int32_t size, std::int32_t start, std::int32_t wi
     return AtLeastZero(s);
 }
 
+// One direction of a control's place: proportional, or anchored to the far edge with the width
+// (or height) it will have, or as it is.
+std::int32_t Place(bool scale, bool keepFar, bool scaleSize, std::int32_t designStart,
+                   std::int32_t designSize, std::int32_t start, std::int32_t size,
+                   std::int32_t window, std::int32_t designWindow) {
+    if (scale) return Scaled(designStart, window, designWindow);
+    if (!keepFar) return start;
+    const std::int32_t newSize =
+        scaleSize ? Proportional(designSize, start, window, designWindow) : size;
+    return AtLeastZero(designStart + window - designWindow - newSize + designSize);
+}
+
 } // namespace
 
 std::int32_t CUiSizingTool::FlagsOf(const std::string& tag) {
@@ -93,18 +105,10 @@ void CUiSizingTool::Resize(const std::vector<ISizedControl*>& controls, std::int
             } catch (...) { // a control without a font
             }
         auto place = [&] {
-            if (f & kScaleLeft)
-                left = Scaled(r.Left, W, DW);
-            else if (f & kKeepRight)
-                left = AtLeastZero(r.Left + W - DW -
-                                   ((f & kScaleWidth) ? Proportional(r.Width, left, W, DW) : w) +
-                                   r.Width);
-            if (f & kScaleTop)
-                top = Scaled(r.Top, H, DH);
-            else if (f & kKeepBottom)
-                top = AtLeastZero(r.Top + H - DH -
-                                  ((f & kScaleHeight) ? Proportional(r.Height, top, H, DH) : h) +
-                                  r.Height);
+            left = Place(f & kScaleLeft, f & kKeepRight, f & kScaleWidth, r.Left, r.Width, left, w,
+                         W, DW);
+            top = Place(f & kScaleTop, f & kKeepBottom, f & kScaleHeight, r.Top, r.Height, top, h,
+                        H, DH);
         };
         place();
         if (f & kKeepShape) {
