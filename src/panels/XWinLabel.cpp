@@ -103,28 +103,27 @@ void XWinLabel::resizeEvent(QResizeEvent* event) {
 
 bool XWinLabel::eventFilter(QObject* watched, QEvent* event) {
     if (watched != m_oLabel) return QWidget::eventFilter(watched, event);
+    const QEvent::Type type = event->type();
+    if (type != QEvent::MouseButtonPress && type != QEvent::MouseMove &&
+        type != QEvent::MouseButtonRelease && type != QEvent::MouseButtonDblClick)
+        return false;
     const auto* mouse = static_cast<QMouseEvent*>(event);
-    auto args = [&] {
-        const QPoint at = mouse->position().toPoint();
-        return std::tuple{
-            ButtonOf(event->type() == QEvent::MouseMove ? mouse->buttons() : mouse->button()),
-            ShiftOf(mouse->modifiers()), at.x(), at.y()};
-    };
-    switch (event->type()) {
+    const QPoint at = mouse->position().toPoint();
+    const int button = ButtonOf(type == QEvent::MouseMove ? mouse->buttons() : mouse->button());
+    const int shift = ShiftOf(mouse->modifiers());
+    switch (type) {
     case QEvent::MouseButtonPress:
-        std::apply([this](auto... a) { emit MouseDown(a...); }, args());
+        emit MouseDown(button, shift, at.x(), at.y());
         break;
     case QEvent::MouseMove:
-        std::apply([this](auto... a) { emit MouseMove(a...); }, args());
+        emit MouseMove(button, shift, at.x(), at.y());
         break;
     case QEvent::MouseButtonRelease:
-        std::apply([this](auto... a) { emit MouseUp(a...); }, args());
-        if (m_oLabel->rect().contains(mouse->position().toPoint())) emit Click();
-        break;
-    case QEvent::MouseButtonDblClick:
-        emit DblClick();
+        emit MouseUp(button, shift, at.x(), at.y());
+        if (m_oLabel->rect().contains(at)) emit Click();
         break;
     default:
+        emit DblClick();
         break;
     }
     return false;
