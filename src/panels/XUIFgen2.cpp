@@ -7,6 +7,7 @@
 #include "qzivi/panels/FunctionPreview.h"
 #include "qzivi/panels/MUiAndStringUtil.h"
 #include "qzivi/panels/Pictures.h"
+#include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 #include "qzivi/widgets/QZGraph.h"
 
@@ -68,6 +69,25 @@ QString Q(const std::string& text) {
     return QString::fromStdString(text);
 }
 
+// An object the panel goes through: none is the failure of an unset object (91), which the
+// handler's step then ignores, as it ignores every other.
+template <typename T>
+T& Set(const std::shared_ptr<T>& object) {
+    if (!object) RaiseRuntime(91, "Object variable not set.");
+    return *object;
+}
+
+// The font of a label made smaller, down to half its size, until its text fits its width.
+void FitText(QLabel* label, double designPoints) {
+    QFont font = label->font();
+    font.setPointSizeF(designPoints);
+    for (double points = designPoints; points > designPoints / 2; points *= 0.92) {
+        font.setPointSizeF(points);
+        if (QFontMetricsF(font).horizontalAdvance(label->text()) <= label->width()) break;
+    }
+    label->setFont(font);
+}
+
 } // namespace
 
 XUIFgen2::XUIFgen2(QWidget* parent) : QWidget(parent) {
@@ -104,6 +124,7 @@ XUIFgen2::XUIFgen2(QWidget* parent) : QWidget(parent) {
     lblChannel->installEventFilter(this);
     m_oGraph = new QZGraph(this);
     m_oGraph->setObjectName(QStringLiteral("qzgrphWaveform"));
+    m_oGraph->ShowLabels(false); // a preview: the shape, not the scale
     m_oGraph->setGeometry(Px(3375), Px(390), Px(1410), Px(840));
     m_oSized.push_back(std::make_unique<SizedWidget>(m_oGraph, "qzgrphWaveform", -1, 31));
     std::vector<ISizedControl*> controls;
@@ -131,6 +152,15 @@ QLabel* XUIFgen2::AddLabel(const char* name, int left, int top, int width, int h
     label->setVisible(visible);
     m_oSized.push_back(std::make_unique<SizedWidget>(label, name, -1, tag));
     return label;
+}
+
+// The channel and the reading in their large font, scaled with the panel, smaller where a long
+// text would not fit.
+void XUIFgen2::FitLargeTexts() {
+    const double scale = std::min(static_cast<double>(height()) / Px(kDesignHeightTwips),
+                                  static_cast<double>(width()) / Px(kDesignWidthTwips));
+    FitText(lblChannel, 18 * scale);
+    FitText(lblReading, 18 * scale);
 }
 
 QSize XUIFgen2::sizeHint() const {
@@ -174,6 +204,7 @@ void XUIFgen2::resizeEvent(QResizeEvent* event) {
     for (const auto& c : m_oSized)
         controls.push_back(c.get());
     Quietly([&] { m_oSizing.Resize(controls, height(), width()); });
+    FitLargeTexts();
     QWidget::resizeEvent(event);
 }
 
@@ -250,11 +281,12 @@ void XUIFgen2::OnInitialized() {
 void XUIFgen2::OnConfigured() {
     if (!HasOutputExtension()) return;
     Quietly([&] { UpdateChannelArrows(); });
-    Quietly([&] { lblChannel->setText(Q(m_oProp->Channels()->ActiveChannel()->Name())); });
+    Quietly([&] { lblChannel->setText(Q(Set(m_oProp->Channels()->ActiveChannel()).Name())); });
     lblError->setVisible(false);
     ShowDriver();
     Quietly([&] { lblWaveform->setText(Q(GetWaveformName())); });
     Quietly([&] { lblReading->setText(Q(GetReadingText())); });
+    FitLargeTexts();
     if (lblWaveform->text() == QLatin1String("DC"))
         Quietly([&] {
             const auto range = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_FUNC_DC_OFFSET, "");
@@ -294,8 +326,9 @@ void XUIFgen2::OnCollectionChanged(const std::string& name) {
 // ---- What it shows -----------------------------------------------------------------------------
 
 void XUIFgen2::UpdateChannelInfo() {
-    lblChannel->setText(Q(m_oProp->Channels()->ActiveChannel()->Name()));
+    lblChannel->setText(Q(Set(m_oProp->Channels()->ActiveChannel()).Name()));
     lblReading->setText(Q(GetReadingText()));
+    FitLargeTexts();
     lblWaveform->setText(Q(GetWaveformName()));
 }
 
@@ -307,39 +340,39 @@ std::string XUIFgen2::GetFormattedReading(double value, bool noDecimals) const {
 }
 
 std::string XUIFgen2::GetWaveformName() const {
-    const auto channel = m_oProp->Channels()->ActiveChannel();
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
     switch (m_oProp->OutputMode()) {
     case qzivifgenOutputFunc: {
         static const char* const kNames[] = {"Sine",    "Square",    "Triangle",
                                              "Ramp Up", "Ramp Down", "DC"};
-        const std::int32_t w = channel->FuncWaveform();
+        const std::int32_t w = channel.FuncWaveform();
         return w >= 1 && w <= 6 ? kNames[w - 1] : "";
     }
     case qzivifgenOutputArb:
-        return channel->ArbWaveform()->Name();
+        return Set(channel.ArbWaveform()).Name();
     case qzivifgenOutputSeq:
-        return channel->Sequence()->Name();
+        return Set(channel.Sequence()).Name();
     default:
         return "";
     }
 }
 
 std::string XUIFgen2::GetReadingText() const {
-    const auto channel = m_oProp->Channels()->ActiveChannel();
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
     switch (m_oProp->OutputMode()) {
     case qzivifgenOutputFunc:
-        if (channel->FuncWaveform() == qzivifgenWaveformDC) {
+        if (channel.FuncWaveform() == qzivifgenWaveformDC) {
             std::string out;
             double value = 0;
-            FormatValueWithUnit(text::FormatNumber(channel->FuncDCOffset()), out, value, "V", 2);
+            FormatValueWithUnit(text::FormatNumber(channel.FuncDCOffset()), out, value, "V", 2);
             return out;
         }
-        return GetFormattedReading(channel->FuncFrequency());
+        return GetFormattedReading(channel.FuncFrequency());
     case qzivifgenOutputArb:
     case qzivifgenOutputSeq: {
         if (m_oProp->Extensions() & qzivifgenArbFrequencyExt)
-            return GetFormattedReading(channel->ArbFrequency());
-        const std::int32_t size = channel->ArbWaveform()->DataSize();
+            return GetFormattedReading(channel.ArbFrequency());
+        const std::int32_t size = Set(channel.ArbWaveform()).DataSize();
         if (size == 0) RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
         return GetFormattedReading(m_oProp->ArbSampleRate() / size);
     }
@@ -357,18 +390,18 @@ std::int32_t XUIFgen2::PreviewInterval(std::int64_t size) const {
 
 void XUIFgen2::DrawPreview(bool checkExtensions) {
     const std::int32_t ext = checkExtensions ? m_oProp->Extensions() : -1;
-    const auto channel = m_oProp->Channels()->ActiveChannel();
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
     switch (m_oProp->OutputMode()) {
     case qzivifgenOutputFunc:
-        if (ext & qzivifgenStdFuncExt) PlotFunction(CyclesForFrequency(channel->FuncFrequency()));
+        if (ext & qzivifgenStdFuncExt) PlotFunction(CyclesForFrequency(channel.FuncFrequency()));
         break;
     case qzivifgenOutputArb:
         if (ext & qzivifgenArbWfmExt) {
-            const auto waveform = channel->ArbWaveform();
+            auto& waveform = Set(channel.ArbWaveform());
             // A held waveform is shown whole: the graph reduces its points to its columns.
-            PlotArbData(waveform->Source() != qzivifgenpersisted
-                            ? waveform->GetDataSample(0, PreviewInterval(waveform->DataSize()), -1)
-                            : waveform->Data());
+            PlotArbData(waveform.Source() != qzivifgenpersisted
+                            ? waveform.GetDataSample(0, PreviewInterval(waveform.DataSize()), -1)
+                            : waveform.Data());
         }
         break;
     case qzivifgenOutputSeq:
@@ -380,14 +413,14 @@ void XUIFgen2::DrawPreview(bool checkExtensions) {
 }
 
 void XUIFgen2::PlotFunction(std::int32_t cycles) {
-    const auto channel = m_oProp->Channels()->ActiveChannel();
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
     double dc = 0;
-    if (channel->FuncWaveform() == qzivifgenWaveformDC) {
+    if (channel.FuncWaveform() == qzivifgenWaveformDC) {
         std::string out;
         FormatValueWithUnit(GetReadingText(), out, dc, "V", 3); // the value shown
     }
     const FunctionPreview preview =
-        BuildFunctionPoints(channel->FuncWaveform(), cycles, dc, m_vDCRange[0], m_vDCRange[1]);
+        BuildFunctionPoints(channel.FuncWaveform(), cycles, dc, m_vDCRange[0], m_vDCRange[1]);
     QZGraph& g = *m_oGraph;
     g.XAxis().Inverted(preview.xInverted);
     g.XAxis().Minimum(preview.xMinimum);
@@ -411,10 +444,9 @@ void XUIFgen2::PlotArbData(std::shared_ptr<const std::vector<double>> data) {
 }
 
 void XUIFgen2::PlotSequenceData() {
-    const auto sequence = m_oProp->Channels()->ActiveChannel()->Sequence();
-    sequence->CollapseIterations(true); // each item once
-    const auto blocks =
-        sequence->GetDataSample(0, PreviewInterval(sequence->PreviewDataSize()), -1);
+    auto& sequence = Set(Set(m_oProp->Channels()->ActiveChannel()).Sequence());
+    sequence.CollapseIterations(true); // each item once
+    const auto blocks = sequence.GetDataSample(0, PreviewInterval(sequence.PreviewDataSize()), -1);
     auto points = std::make_shared<std::vector<double>>();
     for (const auto& block : blocks)
         if (block) points->insert(points->end(), block->begin(), block->end());
@@ -435,7 +467,7 @@ void XUIFgen2::PlotSequenceData() {
 
 void XUIFgen2::StepChannel(bool previous) {
     auto& channels = *m_oProp->Channels();
-    std::int32_t i = channels.IndexOfObject(channels.ActiveChannel().get());
+    std::int32_t i = channels.IndexOfObject(&Set(channels.ActiveChannel()));
     if (previous)
         i = i - 1 < 1 ? channels.Count() : i - 1;
     else
@@ -454,6 +486,7 @@ void XUIFgen2::UpdateChannelArrows() {
 void XUIFgen2::ShowNoChannels() {
     lblReading->setText(QStringLiteral("Off"));
     lblChannel->setText(QStringLiteral("<No Channels>"));
+    FitLargeTexts();
     lblWaveform->clear();
     lblDriver->clear();
     lblSimulated->setVisible(false);

@@ -108,6 +108,8 @@ std::shared_ptr<IQZIviFgenPanel> QZIviFgenWidget::AddChild(const std::string& cl
     const auto maker = Panels().find(className);
     if (maker == Panels().end()) return nullptr; // a panel of another build: none
     m_oPanelWidget = maker->second(this);
+    // A control that no form has sized yet takes the panel's design size.
+    if (width() <= 1 || height() <= 1) resize(m_oPanelWidget->sizeHint());
     auto* panel = dynamic_cast<IQZIviFgenPanel*>(m_oPanelWidget);
     // The widget belongs to this form; the control only points at it until RemoveChild.
     return std::shared_ptr<IQZIviFgenPanel>(std::shared_ptr<void>(), panel);

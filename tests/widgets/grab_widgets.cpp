@@ -108,8 +108,53 @@ int main(int argc, char** argv) {
     noise.PlotY(std::move(big));
     Save(noise, folder, "qzgraph-noise-10M");
 
-    // The About box of a control with a session on the simulator, grabbed while it is open.
+    // The display panel in each output mode, and with an error lit.
     qputenv("QZIVI_SESSION_MANAGER", "none");
+    {
+        QZIviFgenWidget display;
+        display.setProperty("UIStyle", 2);
+        auto& c = display.Control();
+        c.ExceptionOnError(false);
+        c.Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt);
+        const auto channel = c.Channels()->Add("Channel1");
+        channel->FuncFrequency(2500);
+        c.Configure();
+        Save(display, folder, "xuifgen2-sine");
+        channel->FuncWaveform(qzivifgenWaveformSquare);
+        c.Configure();
+        Save(display, folder, "xuifgen2-square");
+        channel->FuncWaveform(qzivifgenWaveformDC);
+        channel->FuncDCOffset(-1.25);
+        c.Configure();
+        Save(display, folder, "xuifgen2-dc");
+        std::vector<double> ramp(4096);
+        for (std::size_t i = 0; i < ramp.size(); ++i)
+            ramp[i] = std::sin(2 * M_PI * static_cast<double>(i) / 4096) *
+                      std::exp(-static_cast<double>(i) / 2000.0);
+        const auto decay = c.Waveforms()->Add("Decay");
+        decay->Data(ramp);
+        c.OutputMode(qzivifgenOutputArb);
+        c.Configure();
+        Save(display, folder, "xuifgen2-arbitrary");
+        std::vector<double> steps(1024);
+        for (std::size_t i = 0; i < steps.size(); ++i)
+            steps[i] = i < 512 ? 0.5 : -0.25;
+        const auto step = c.Waveforms()->Add("Step");
+        step->Data(steps);
+        const auto sequence = c.Sequences()->Add("Burst");
+        sequence->Add(decay, 2);
+        sequence->Add(step, 1);
+        c.OutputMode(qzivifgenOutputSeq);
+        c.Configure();
+        Save(display, folder, "xuifgen2-sequence");
+        c.LogicalName("NoSuchGenerator");
+        c.Configure();
+        Save(display, folder, "xuifgen2-error");
+        display.resize(display.size() * 2);
+        Save(display, folder, "xuifgen2-error-twice-the-size");
+    }
+
+    // The About box of a control with a session on the simulator, grabbed while it is open.
     QZIviFgenWidget control;
     control.Control().Init();
     QTimer::singleShot(200, [&] {

@@ -47,7 +47,7 @@ void QZGraph::resizeEvent(QResizeEvent* event) {
 
 QRectF QZGraph::PlotArea() const {
     // Room for the labels only where the plot is large enough to carry them.
-    const bool labels = width() >= 160 && height() >= 90;
+    const bool labels = m_bLabels && width() >= 160 && height() >= 90;
     const double left = labels ? fontMetrics().horizontalAdvance(QStringLiteral("-20.0m")) + 6 : 1;
     const double top = labels ? fontMetrics().height() / 2.0 + 1 : 1;
     const double bottom = labels ? fontMetrics().height() + 4 : 1;

@@ -76,6 +76,7 @@ private:
     void UpdateChannelArrows();
     void ShowNoChannels();
     void ShowDriver();
+    void FitLargeTexts();
     bool HasOutputExtension() const;
     std::int32_t PreviewInterval(std::int64_t size) const;
 

@@ -31,6 +31,11 @@ public:
     void ClearData();
     const std::shared_ptr<const std::vector<double>>& Data() const { return m_oPoints; }
 
+    // The axis labels, shown where the plot is large enough to carry them (the default).
+    void ShowLabels(bool show) {
+        m_bLabels = show;
+        Invalidate();
+    }
     // The plot's area inside the axis labels.
     QRectF PlotArea() const;
     // The columns drawn at the present width, one a device pixel (for tests and the benchmark).
@@ -52,6 +57,7 @@ private:
     std::shared_ptr<const std::vector<double>> m_oPoints;
     std::vector<ColumnRange> m_oColumns;
     bool m_bColumnsValid = false;
+    bool m_bLabels = true;
     int m_lColumnsWidth = -1;
 };
 
