@@ -76,6 +76,11 @@ private slots:
         QCOMPARE(Display()->Graph().Data().get(), waveform->Data().get());
         QCOMPARE(Display()->Graph().YAxis().Minimum(), 0.0);
         QCOMPARE(Text("lblReading"), QStringLiteral("100.000000 uHz")); // 1000 / 10M
+        // A new waveform drops the channel's reference while the panel shows it: the panel's
+        // steps fail quietly and leave what they showed.
+        Control().Waveforms()->Add("Another");
+        QVERIFY(Control().Channels()->Item(1)->ArbWaveform() == nullptr);
+        QCOMPARE(Text("lblWaveform"), QStringLiteral("Big"));
     }
 
     void anErrorLightsTheLampUntilTheNextGoodConfigure() {
