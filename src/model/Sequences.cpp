@@ -348,6 +348,7 @@ void QZIviFgenSequences::InitProperties() {
     m_oUsers.clear();
     m_oForeign.clear();
     m_oWithoutWaveform.clear();
+    m_nPruneAt = 64;
 }
 
 bool QZIviFgenSequences::InTree(const QZIviFgenSequenceItem& item) const {
@@ -360,7 +361,13 @@ void QZIviFgenSequences::Refer(QZIviFgenSequenceItem& item) {
     if (self.expired()) return; // an item no tree can hold
     const QZIviFgenArbWaveform* waveform = item.m_oWaveform.get();
     if (!waveform) {
+        // Every new item passes through here on its way to a waveform: the list is pruned
+        // whenever it has doubled, so it stays near the number of items truly without one.
         m_oWithoutWaveform.push_back(std::move(self));
+        if (m_oWithoutWaveform.size() >= m_nPruneAt) {
+            PruneWithoutWaveform();
+            m_nPruneAt = std::max<std::size_t>(64, 2 * m_oWithoutWaveform.size());
+        }
         return;
     }
     m_oUsers[waveform].push_back(std::move(self));
@@ -401,11 +408,15 @@ std::vector<const QZIviFgenArbWaveform*> QZIviFgenSequences::ForeignNamed(const 
     return named;
 }
 
-void QZIviFgenSequences::RemoveItemsOf(const QZIviFgenArbWaveform& waveform) {
+void QZIviFgenSequences::PruneWithoutWaveform() {
     std::erase_if(m_oWithoutWaveform, [&](const std::weak_ptr<QZIviFgenSequenceItem>& entry) {
         const auto item = entry.lock();
         return !item || item->m_oWaveform || !InTree(*item);
     });
+}
+
+void QZIviFgenSequences::RemoveItemsOf(const QZIviFgenArbWaveform& waveform) {
+    PruneWithoutWaveform();
     if (!m_oWithoutWaveform.empty())
         RaiseRuntime(91, "Object variable not set: a sequence item has no waveform.");
     const auto propSet = PropSet();
@@ -427,6 +438,7 @@ void QZIviFgenSequences::RemoveItemsOf(const QZIviFgenArbWaveform& waveform) {
     });
     for (const Place& place : places)
         At(place.sequence)->Remove(place.item);
+    m_oUsers.erase(&waveform); // it is leaving the tree
 }
 
 void QZIviFgenSequences::WaveformRenamed(const std::string& now, const std::string& before) {

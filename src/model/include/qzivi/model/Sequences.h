@@ -154,10 +154,12 @@ private:
     // The waveforms of other copies that items here use, named `name` (exactly, or ignoring
     // case); those no item uses any more are dropped.
     std::vector<const QZIviFgenArbWaveform*> ForeignNamed(const std::string& name, bool ignoreCase);
+    void PruneWithoutWaveform();
 
     std::unordered_map<const QZIviFgenArbWaveform*, Users> m_oUsers;
     std::unordered_set<const QZIviFgenArbWaveform*> m_oForeign;
     Users m_oWithoutWaveform;
+    std::size_t m_nPruneAt = 64;
 };
 
 } // namespace qzivi
