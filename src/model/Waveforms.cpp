@@ -183,6 +183,11 @@ void QZIviFgenArbWaveform::ReadProperties(const PropertyBag& bag, const std::str
     if (m_lSource != 0) return;
     const std::int32_t byteSize = bag.ReadInt32(p + "ByteSize", 0);
     if (byteSize <= 0) return;
+    if (byteSize % static_cast<std::int32_t>(sizeof(double)) != 0)
+        RaiseRuntime(runtime::kImproperFile, "The waveform \"" + m_sName + "\" claims " +
+                                                 std::to_string(byteSize) +
+                                                 " bytes of points, which is no whole number of "
+                                                 "8-byte points.");
     const SharedBytes bytes = bag.ReadSharedBytes(p + "Data");
     if (bytes.size() < static_cast<std::size_t>(byteSize))
         RaiseRuntime(runtime::kImproperFile, "The waveform \"" + m_sName + "\" claims " +

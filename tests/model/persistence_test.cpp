@@ -127,6 +127,18 @@ TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
     shortPoints.WriteBytes("Waveforms_Item1_Waveform_Data", Bytes(16));
     EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(shortPoints, "", true); }),
               runtime::kImproperFile);
+    // A size of part of a point, with bytes enough behind it: refused, not cut or read from
+    // nothing.
+    for (const std::int32_t size : {1, 7, 13}) {
+        PropertyBag partial;
+        partial.WriteInt32("Waveforms_ItemCount", 1, 0);
+        partial.WriteInt32("Waveforms_Item1_Waveform_Source", 0, 1);
+        partial.WriteInt32("Waveforms_Item1_Waveform_ByteSize", size, 0);
+        partial.WriteBytes("Waveforms_Item1_Waveform_Data", Bytes(64));
+        EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(partial, "", true); }),
+                  runtime::kImproperFile)
+            << size;
+    }
 }
 
 } // namespace

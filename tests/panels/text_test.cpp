@@ -102,3 +102,37 @@ TEST(SelectComboEntry, ChoosesByTextDataOrNumber) {
 
 } // namespace
 } // namespace qzivi
+
+namespace qzivi {
+namespace {
+
+// What a hostile or careless text gives: the number it holds, infinite where it is too large,
+// and never the part of a number that happened to fit.
+TEST(ParseLeadingNumber, TooLargeIsInfiniteAndWordsAreNoNumbers) {
+    EXPECT_EQ(ParseLeadingNumber("1e400"), HUGE_VAL);
+    EXPECT_EQ(ParseLeadingNumber("-1e400 V"), -HUGE_VAL);
+    EXPECT_EQ(ParseLeadingNumber("1e-400"), 0);
+    EXPECT_EQ(ParseLeadingNumber("nan"), 0);
+    EXPECT_EQ(ParseLeadingNumber("inf Hz"), 0);
+    EXPECT_EQ(ParseLeadingNumber("2e Hz"), 2) << "an exponent needs digits";
+    EXPECT_EQ(ParseLeadingNumber("1.5.3"), 1.5);
+    const std::string blanks = std::string(1'000'000, ' ') + "7 V";
+    EXPECT_EQ(ParseLeadingNumber(blanks), 7);
+}
+
+TEST(FormatEngineering, HugeDigitCountsAndNonNumbersStayWhole) {
+    const std::string many = FormatEngineering(1.5e300, 100000);
+    ASSERT_FALSE(many.empty());
+    EXPECT_EQ(many.substr(0, 4), " 150") << "1.5e282 exa, its digits kept";
+    EXPECT_EQ(many.size(), 1u + 283 + 1 + 100 + 2) << "at 100 decimals at most";
+    EXPECT_EQ(many.back(), 'E');
+    EXPECT_EQ(FormatEngineering(NAN, 2), " NaN ");
+    EXPECT_EQ(FormatEngineering(-INFINITY, 2), "-Inf ");
+    std::string text;
+    double value = 0;
+    FormatValueWithUnit("nan", text, value, "Hz", 2);
+    EXPECT_EQ(text, "0.00 Hz") << "a word is no number";
+}
+
+} // namespace
+} // namespace qzivi

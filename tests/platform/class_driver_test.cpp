@@ -207,3 +207,35 @@ TEST_F(ClassDriverTest, AModuleOthersCanWriteIsNeverLoaded) {
 }
 
 } // namespace
+
+namespace {
+
+// A text buffer that cannot take the text is refused, never answered with success, and an error
+// waiting to be read stays until a buffer can take it.
+TEST(ClassDriverBuffers, NegativeSizesAndNullBuffersAreRefused) {
+    qzivi::test::StoreScope scope;
+    qzivi::test::Session s;
+    const ViSession vi = s.vi();
+    ViChar text[64] = {};
+    EXPECT_EQ(IviFgen_GetAttributeViString(vi, "", IVI_ATTR_SPECIFIC_DRIVER_PREFIX, -1, text),
+              IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(IviFgen_GetAttributeViString(vi, "", IVI_ATTR_LOGICAL_NAME, -5, text),
+              IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(IviFgen_GetAttributeViString(vi, "", IVI_ATTR_SPECIFIC_DRIVER_PREFIX, 10, nullptr),
+              IVI_ERROR_NULL_POINTER);
+    ViInt32 list = 0, count = 0;
+    ASSERT_EQ(Ivi_GetLogicalNamesList(&list, &count), VI_SUCCESS);
+    ViBoolean found = VI_FALSE;
+    EXPECT_EQ(Ivi_GetNthLogicalName(list, 1, nullptr, 16, &found), IVI_ERROR_NULL_POINTER);
+    Ivi_DisposeLogicalNamesList(list);
+
+    ASSERT_LT(IviFgen_ConfigureOutputImpedance(vi, "Channel9", 50), 0);
+    ViStatus code = 0;
+    EXPECT_EQ(IviFgen_GetError(vi, &code, 64, nullptr), IVI_ERROR_NULL_POINTER);
+    EXPECT_EQ(IviFgen_GetError(vi, &code, -1, text), IVI_ERROR_INVALID_VALUE);
+    ViChar whole[512] = {};
+    EXPECT_EQ(IviFgen_GetError(vi, &code, sizeof whole, whole), VI_SUCCESS);
+    EXPECT_EQ(code, IVI_ERROR_UNKNOWN_CHANNEL_NAME) << "the error stayed to be read";
+}
+
+} // namespace

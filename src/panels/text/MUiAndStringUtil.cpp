@@ -3,8 +3,10 @@
 #include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 
+#include <algorithm>
 #include <charconv>
 #include <cmath>
+#include <cstdlib>
 
 namespace qzivi {
 
@@ -36,20 +38,54 @@ constexpr Prefix kPrefixes[] = {
 
 } // namespace
 
+// The number token at the start of `text`: a sign, digits with one point, and an exponent that
+// has digits. One pass: a long run of anything costs its length, not its square.
+std::string_view NumberToken(std::string_view text) {
+    std::size_t i = 0;
+    if (i < text.size() && (text[i] == '+' || text[i] == '-')) ++i;
+    const std::size_t mantissa = i;
+    while (i < text.size() && text[i] >= '0' && text[i] <= '9')
+        ++i;
+    if (i < text.size() && text[i] == '.') ++i;
+    while (i < text.size() && text[i] >= '0' && text[i] <= '9')
+        ++i;
+    if (i == mantissa || (i == mantissa + 1 && text[mantissa] == '.')) return {};
+    if (i < text.size() && (text[i] == 'e' || text[i] == 'E')) {
+        std::size_t j = i + 1;
+        if (j < text.size() && (text[j] == '+' || text[j] == '-')) ++j;
+        const std::size_t digits = j;
+        while (j < text.size() && text[j] >= '0' && text[j] <= '9')
+            ++j;
+        if (j > digits) i = j;
+    }
+    return text.substr(0, i);
+}
+
 double ParseLeadingNumber(std::string_view text) {
-    if (const auto whole = text::ParseNumber(text)) return *whole;
-    if (text.empty()) return 0;
-    std::string_view rest = text;
+    if (const auto whole = text::ParseNumber(text); whole && std::isfinite(*whole)) return *whole;
+    std::string_view rest;
     for (std::size_t i = 0; i < text.size(); ++i) {
         if (text[i] < '0' || text[i] > '9') continue;
         // A sign or a point just before the digit belongs to the number; a digit in first place
         // cuts nothing.
-        rest = i > 0 && IsNumber(text.substr(i - 1, 2)) ? text.substr(i - 1) : text.substr(i);
+        const bool joins =
+            i > 0 && (text[i - 1] == '-' || text[i - 1] == '+' || text[i - 1] == '.');
+        rest = joins && IsNumber(text.substr(i - 1, 2)) ? text.substr(i - 1) : text.substr(i);
         break;
     }
-    for (std::size_t n = rest.size(); n > 0; --n)
-        if (const auto number = text::ParseNumber(rest.substr(0, n))) return *number;
-    return 0;
+    std::string_view token = NumberToken(rest);
+    if (token.empty()) return 0;
+    const bool negative = token.front() == '-';
+    if (token.front() == '+' || negative) token.remove_prefix(1);
+    double value = 0;
+    const auto [end, error] = std::from_chars(token.data(), token.data() + token.size(), value);
+    if (error == std::errc::result_out_of_range) {
+        // Too large for a number is infinite, not the digits that happened to fit; too small is 0.
+        const bool huge = std::fabs(std::strtod(std::string(token).c_str(), nullptr)) > 1;
+        value = huge ? HUGE_VAL : 0;
+    }
+    (void)end;
+    return negative ? -value : value;
 }
 
 std::int32_t PrefixExponent(char c) {
@@ -98,6 +134,8 @@ std::string RepeatChar(std::string_view text, std::int32_t count) {
 }
 
 std::string FormatEngineering(double value, std::int32_t decimals) {
+    if (std::isnan(value)) return " NaN ";
+    if (std::isinf(value)) return value > 0 ? " Inf " : "-Inf ";
     const double e = Log10Abs(value, true);
     const char* letter = "a";
     double scale = 1e18;
@@ -107,9 +145,10 @@ std::string FormatEngineering(double value, std::int32_t decimals) {
             scale = p.scale;
             break;
         }
-    char number[400];
+    // At most 100 decimals: the largest double scaled down to exa still fits the buffer with them.
+    char number[512];
     const auto [end, error] = std::to_chars(number, number + sizeof number, value * scale,
-                                            std::chars_format::fixed, std::max(decimals, 0));
+                                            std::chars_format::fixed, std::clamp(decimals, 0, 100));
     std::string text = value >= 0 ? " " : "";
     text.append(number, error == std::errc() ? end : number);
     return text + " " + letter;

@@ -78,6 +78,11 @@ void StatusMessage(ViStatus status, ViChar message[256]) {
 }
 
 ViInt32 CopyText(std::string_view text, ViInt32 bufferSize, ViChar* buffer) {
+    if (bufferSize < 0)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "the buffer size " + std::to_string(bufferSize) + " is negative");
+    if (bufferSize > 0 && buffer == nullptr)
+        throw StatusError(IVI_ERROR_NULL_POINTER, "the text buffer is a null pointer");
     const auto needed = static_cast<ViInt32>(std::min<size_t>(text.size() + 1, 0x7FFFFFFF));
     if (bufferSize <= 0 || buffer == nullptr) return bufferSize == 0 ? needed : 0;
     const auto n = static_cast<size_t>(std::min(needed - 1, bufferSize - 1));
@@ -177,6 +182,9 @@ ViStatus ErrorRecord::Set(ViStatus failure, const char* function, const char* wh
 }
 
 ViStatus ErrorRecord::Report(ViStatus* code, ViInt32 bufferSize, ViChar description[]) noexcept {
+    // A buffer that cannot take the text is refused, and the error stays to be read.
+    if (bufferSize < 0) return IVI_ERROR_INVALID_VALUE;
+    if (bufferSize > 0 && description == nullptr) return IVI_ERROR_NULL_POINTER;
     ViStatus result = 0;
     try {
         ViChar text[256];
@@ -184,7 +192,7 @@ ViStatus ErrorRecord::Report(ViStatus* code, ViInt32 bufferSize, ViChar descript
         result = CopyText(status == 0 ? std::string() : std::string(text) + " " + elaboration,
                           bufferSize, description);
     } catch (...) { // no room for the text: the status alone
-        result = CopyText("", bufferSize, description);
+        if (bufferSize > 0) description[0] = '\0';
     }
     if (code != nullptr) *code = status;
     if (bufferSize != 0) {

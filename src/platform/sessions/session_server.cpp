@@ -34,8 +34,12 @@ std::string Key(std::string_view name) {
     return key;
 }
 
-int32_t Fail(int32_t number, const std::string& text, char* error, int32_t errorSize) {
-    CopyText(text, errorSize, error);
+// The failure's text goes to the caller's buffer where one can take it; the number always returns.
+int32_t Fail(int32_t number, const std::string& text, char* error, int32_t errorSize) noexcept {
+    try {
+        CopyText(text, errorSize, error);
+    } catch (...) {
+    }
     return number;
 }
 

@@ -22,6 +22,7 @@ std::string StatusHex(ViStatus status);
 
 // Copies `text` into a caller buffer as IVI does: with `bufferSize` 0 nothing is written; if the
 // text does not fit it is cut, and the size it needs (with the NUL) is returned; 0 otherwise.
+// Throws StatusError for a negative size or a null buffer of a positive size.
 ViInt32 CopyText(std::string_view text, ViInt32 bufferSize, ViChar* buffer);
 
 bool EqualsNoCase(std::string_view a, std::string_view b);
