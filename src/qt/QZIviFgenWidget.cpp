@@ -2,6 +2,7 @@
 
 #include "qzivi/control/Panel.h"
 #include "qzivi/model/PropertyBag.h"
+#include "qzivi/panels/XUIFgen1.h"
 #include "qzivi/panels/XUIFgen2.h"
 #include "qzivi/panels/XUILess.h"
 #include "qzivi/qt/QtTickSource.h"
@@ -17,6 +18,7 @@ namespace {
 std::map<std::string, QZIviFgenWidget::PanelMaker>& Panels() {
     static std::map<std::string, QZIviFgenWidget::PanelMaker> panels = {
         {"QZIviFgenLib.XUILess", [](QWidget* parent) { return new XUILess(parent); }},
+        {"QZIviFgenLib.XUIFgen1", [](QWidget* parent) { return new XUIFgen1(parent); }},
         {"QZIviFgenLib.XUIFgen2", [](QWidget* parent) { return new XUIFgen2(parent); }},
     };
     return panels;

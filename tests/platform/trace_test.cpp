@@ -49,6 +49,20 @@ TEST(Trace, RecordsEveryCallInOrderWithArgumentsAndStatus) {
         EXPECT_THAT(record.Line(), StartsWith(record.function + "("));
 }
 
+// A value the trace shows is the value the driver got: short where fifteen digits give it back,
+// all seventeen where they would not.
+TEST(Trace, ShowsRealsExactly) {
+    StoreScope scope;
+    Session s;
+    TraceRecorder recorder;
+    const double knob = 1234.5678901234567;
+    IviFgen_ConfigureStandardWaveform(s.vi(), "Channel1", IVIFGEN_VAL_WFM_SINE, 0.1, 0, knob, 0);
+    const std::string args = recorder.Records().at(0).arguments;
+    EXPECT_THAT(args, HasSubstr(", 1, 0.1, 0, "));
+    const std::string shown = args.substr(args.rfind(", ", args.size() - 4) + 2);
+    EXPECT_EQ(std::stod(shown), knob) << shown;
+}
+
 // A download shows its points by their count and the values at both ends, so that the trace tells
 // which waveform went to the instrument.
 TEST(Trace, ShowsArraysByLengthAndTheirEnds) {

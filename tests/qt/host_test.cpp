@@ -68,6 +68,7 @@ private slots:
         const auto* icon = designed.findChild<XUILess*>();
         QVERIFY(icon != nullptr);
         QCOMPARE(designed.size(), QSize(29, 29));
+        designed.show();
         designed.resize(500, 500);
         QCOMPARE(designed.size(), QSize(29, 29)); // the panel has the last word
         QCOMPARE(icon->UiState() & 1, 1);

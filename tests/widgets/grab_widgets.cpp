@@ -108,34 +108,36 @@ int main(int argc, char** argv) {
     noise.PlotY(std::move(big));
     Save(noise, folder, "qzgraph-noise-10M");
 
-    // The display panel in each output mode, and with an error lit.
+    // The display panel and the front panel in each output mode, and with an error lit.
     qputenv("QZIVI_SESSION_MANAGER", "none");
-    {
+    for (const int style : {2, 1}) {
+        const QString name = QStringLiteral("xuifgen%1-").arg(style);
         QZIviFgenWidget display;
-        display.setProperty("UIStyle", 2);
+        display.setProperty("UIStyle", style);
         auto& c = display.Control();
         c.ExceptionOnError(false);
         c.Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt);
         const auto channel = c.Channels()->Add("Channel1");
         channel->FuncFrequency(2500);
         c.Configure();
-        Save(display, folder, "xuifgen2-sine");
+        Save(display, folder, name + "sine");
         channel->FuncWaveform(qzivifgenWaveformSquare);
         c.Configure();
-        Save(display, folder, "xuifgen2-square");
+        Save(display, folder, name + "square");
         channel->FuncWaveform(qzivifgenWaveformDC);
         channel->FuncDCOffset(-1.25);
         c.Configure();
-        Save(display, folder, "xuifgen2-dc");
+        Save(display, folder, name + "dc");
         std::vector<double> ramp(4096);
         for (std::size_t i = 0; i < ramp.size(); ++i)
             ramp[i] = std::sin(2 * M_PI * static_cast<double>(i) / 4096) *
                       std::exp(-static_cast<double>(i) / 2000.0);
         const auto decay = c.Waveforms()->Add("Decay");
         decay->Data(ramp);
+        channel->ArbWaveform(decay);
         c.OutputMode(qzivifgenOutputArb);
         c.Configure();
-        Save(display, folder, "xuifgen2-arbitrary");
+        Save(display, folder, name + "arbitrary");
         std::vector<double> steps(1024);
         for (std::size_t i = 0; i < steps.size(); ++i)
             steps[i] = i < 512 ? 0.5 : -0.25;
@@ -146,12 +148,12 @@ int main(int argc, char** argv) {
         sequence->Add(step, 1);
         c.OutputMode(qzivifgenOutputSeq);
         c.Configure();
-        Save(display, folder, "xuifgen2-sequence");
+        Save(display, folder, name + "sequence");
         c.LogicalName("NoSuchGenerator");
         c.Configure();
-        Save(display, folder, "xuifgen2-error");
+        Save(display, folder, name + "error");
         display.resize(display.size() * 2);
-        Save(display, folder, "xuifgen2-error-twice-the-size");
+        Save(display, folder, name + "error-twice-the-size");
     }
 
     // The About box of a control with a session on the simulator, grabbed while it is open.

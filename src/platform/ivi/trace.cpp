@@ -3,6 +3,7 @@
 #include "qzivi/ivi_common.h"
 
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <fstream>
 #include <mutex>
@@ -36,8 +37,10 @@ void AppendArgument(std::string& out, ViBoolean v, ViStatus) {
     out += std::to_string(v);
 }
 void AppendArgument(std::string& out, ViReal64 v, ViStatus) {
+    // Fifteen digits where they give the value back, all seventeen where they would not.
     char text[32];
     std::snprintf(text, sizeof text, "%.15g", v);
+    if (std::strtod(text, nullptr) != v) std::snprintf(text, sizeof text, "%.17g", v);
     out += text;
 }
 void AppendArgument(std::string& out, ViConstString v, ViStatus) {

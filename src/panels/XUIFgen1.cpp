@@ -1,0 +1,992 @@
+#include "qzivi/panels/XUIFgen1.h"
+
+#include "qzivi/driver/CIviErrorReport.h"
+#include "qzivi/driver/ErrorModule.h"
+#include "qzivi/engine/CIviFgenIOImp.h"
+#include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/panels/CPaintFlickerFree.h"
+#include "qzivi/panels/MUiAndStringUtil.h"
+#include "qzivi/panels/Pictures.h"
+#include "qzivi/panels/SizedWidget.h"
+#include "qzivi/panels/XUIFgen2.h"
+#include "qzivi/panels/XWinLabel.h"
+#include "qzivi/support/failure.h"
+#include "qzivi/support/text.h"
+#include "qzivi/widgets/QZButton.h"
+#include "qzivi/widgets/QZKnob.h"
+
+#include <QComboBox>
+#include <QFocusEvent>
+#include <QFrame>
+#include <QKeyEvent>
+#include <QLineEdit>
+#include <QPainter>
+#include <QToolButton>
+
+#include <cmath>
+#include <cstdio>
+
+namespace qzivi {
+
+namespace {
+
+int Px(int twips) {
+    return static_cast<int>(std::lround(TwipsToPixels(twips)));
+}
+
+template <typename F>
+void Quietly(F&& step) {
+    try {
+        step();
+    } catch (...) {
+    }
+}
+
+// An object the panel goes through: none is the failure of an unset object (91).
+template <typename T>
+T& Set(const std::shared_ptr<T>& object) {
+    if (!object) RaiseRuntime(91, "Object variable not set.");
+    return *object;
+}
+
+// A flag held for the length of a scope, cleared on every way out.
+struct Hold {
+    explicit Hold(bool& flag) : flag(flag) { flag = true; }
+    ~Hold() { flag = false; }
+    bool& flag;
+};
+
+struct Place {
+    int left, top, width, height;
+};
+
+const char* const kFunctionTips[] = {
+    "Sine wave", "Square wave", "Triangular wave",     "Ramp up",
+    "Ramp down", "DC output",   "Arbritrary waveform", "Sequence waveform"};
+constexpr int kFunctionLefts[] = {120, 1092, 2064, 3030, 4008, 4980, 5952, 6930};
+constexpr int kOffPictures[] = {5001, 5002, 5003, 5004, 5005, 5006, 5100, 5150};
+constexpr int kOnPictures[] = {5051, 5052, 5053, 5054, 5055, 5056, 5101, 5151};
+constexpr Place kLabels[] = {{600, 3960, 1110, 255},  {1890, 3960, 1215, 255},
+                             {3270, 3960, 1080, 255}, {4545, 3960, 1200, 255},
+                             {225, 5580, 870, 210},   {1215, 5580, 870, 225}};
+const char* const kCaptions[] = {"Frequency", "DC Offset", "Amplitude", "Duty Cycle", "", ""};
+constexpr Place kKnobs[] = {
+    {645, 4275, 1050, 930}, {2130, 4245, 810, 735}, {3420, 4260, 810, 735}, {4740, 4260, 810, 735}};
+constexpr int kKnobTags[] = {15, 31, 31, 31};
+constexpr Place kFields[] = {
+    {315, 5835, 1680, 330}, {2040, 5160, 990, 375}, {3405, 5160, 840, 375}, {4710, 5160, 855, 375}};
+const char* const kFieldTexts[] = {"0.000000 Hz", "0.00 V", "1.00 V", "0.00 %"};
+const char* const kUnits[] = {"Hz", "V", "V", "%"};
+constexpr int kDecimals[] = {6, 2, 2, 2};
+
+} // namespace
+
+XUIFgen1::XUIFgen1(QWidget* parent) : QWidget(parent) {
+    setAccessibleName(tr("Function generator front panel"));
+    resize(Px(kDesignWidthTwips), Px(kDesignHeightTwips));
+    QFont font(QStringLiteral("Arial"));
+    font.setPointSizeF(11.25);
+    setFont(font);
+    auto sized = [&](QWidget* w, const char* name, int index, Place p, int tag) {
+        w->setObjectName(index < 0
+                             ? QString::fromUtf8(name)
+                             : QStringLiteral("%1%2").arg(QString::fromUtf8(name)).arg(index));
+        w->setGeometry(Px(p.left), Px(p.top), Px(p.width), Px(p.height));
+        m_oSized.push_back(std::make_unique<SizedWidget>(w, name, index, tag));
+    };
+    Frame1 = new QFrame(this);
+    Frame2 = new QFrame(this);
+    for (QFrame* frame : {Frame1, Frame2})
+        frame->setFrameStyle(QFrame::StyledPanel | QFrame::Sunken);
+    sized(Frame1, "Frame1", -1, {120, 3645, 5700, 2790}, 31);
+    sized(Frame2, "Frame2", -1, {5895, 3645, 1815, 2790}, 31);
+
+    m_oDisplay = new XUIFgen2(this);
+    sized(m_oDisplay, "XUIFgen2", -1, {120, 135, 7575, 2865}, 15);
+    m_oDisplay->installEventFilter(this);
+
+    for (int i = 1; i <= 8; ++i) {
+        auto* button = new QZButton(this);
+        button->Index(i);
+        button->setToolTip(QString::fromUtf8(kFunctionTips[i - 1]));
+        button->setAccessibleName(button->toolTip());
+        button->OffPicture(LoadPictureFromResource(kOffPictures[i - 1]));
+        button->OnPicture(LoadPictureFromResource(kOnPictures[i - 1]));
+        sized(button, "qzbtnFunction", i, {kFunctionLefts[i - 1], 3120, 765, 465}, 31);
+        connect(button, &QZButton::Click, this, [this](int index) { FunctionClick(index); });
+        qzbtnFunction[i] = button;
+    }
+    for (int i = 0; i < 6; ++i) {
+        lblFgen[i] = new XWinLabel(this);
+        lblFgen[i]->Caption(kCaptions[i]);
+        if (i >= 4) {
+            QFont small = font;
+            small.setPointSizeF(9);
+            lblFgen[i]->setFont(small); // the sizing tool scales it with the panel
+            lblFgen[i]->Alignment(i == 4 ? 0 : 1);
+        }
+        sized(lblFgen[i], "lblFgen", i, kLabels[i], 31);
+    }
+    for (int i = 0; i < 4; ++i) {
+        auto* knob = new QZKnob(this);
+        knob->Index(i);
+        knob->Minimum(1);
+        knob->Maximum(10);
+        knob->setAccessibleName(QString::fromUtf8(kCaptions[i]));
+        sized(knob, "knobFgen", i, kKnobs[i], kKnobTags[i]);
+        connect(knob, &QZKnob::Pressed, this, [this] { KnobPressed(); });
+        connect(knob, &QZKnob::Released, this, [this] { KnobReleased(); });
+        connect(knob, &QZKnob::ValueChanged, this,
+                [this](int index, double value) { KnobChanged(index, value); });
+        connect(knob, &QZKnob::ValueCommitted, this,
+                [this](int index, double value) { KnobCommitted(index, value); });
+        knobFgen[i] = knob;
+
+        auto* field = new QLineEdit(QString::fromUtf8(kFieldTexts[i]), this);
+        field->setAccessibleName(QString::fromUtf8(kCaptions[i]));
+        field->installEventFilter(this);
+        if (i == 0) { // room for a reading of nine digits and its unit
+            QFont reading = font;
+            reading.setPointSizeF(10);
+            field->setFont(reading);
+        }
+        sized(field, "txtInput", i, kFields[i], 31);
+        txtInput[i] = field;
+    }
+    m_oArrows[0] = LoadPictureFromResource(5152);
+    m_oArrows[1] = LoadPictureFromResource(5153);
+    m_oArrows[2] = LoadPictureFromResource(5154);
+    m_oArrows[3] = LoadPictureFromResource(5155);
+    for (int i = 0; i < 2; ++i) {
+        auto* button = new QToolButton(this);
+        button->setAutoRaise(true);
+        button->setAccessibleName(i == 0 ? tr("One decade up") : tr("One decade down"));
+        button->setToolTip(button->accessibleName());
+        sized(button, "cmdMulFactor", i, {i == 0 ? 1290 : 900, 5235, 165, 255}, 31);
+        connect(button, &QToolButton::clicked, this, [this, i] { DecadeClick(i); });
+        cmdMulFactor[i] = button;
+    }
+    ShowDecadeButtons(true);
+    auto list = [&](XWinLabel*& label, QComboBox*& combo, const char* labelName,
+                    const char* comboName, const char* caption, const char* tip, Place labelAt,
+                    Place comboAt, bool waveforms) {
+        label = new XWinLabel(this);
+        label->Caption(caption);
+        label->ToolTipText2(tip);
+        sized(label, labelName, -1, labelAt, 31);
+        combo = new QComboBox(this);
+        combo->setPlaceholderText(QStringLiteral("None"));
+        combo->setToolTip(QString::fromUtf8(tip));
+        combo->setAccessibleName(QString::fromUtf8(caption).trimmed());
+        combo->installEventFilter(this);
+        sized(combo, comboName, -1, comboAt, 31);
+        connect(combo, &QComboBox::activated, this, [this, waveforms] { ListPicked(waveforms); });
+    };
+    list(lblArbList, cmbArbWfmList, "lblArbList", "cmbArbWfmList", " Waveforms",
+         "Lists the arbitrary waveforms", {5985, 3960, 1395, 255}, {6030, 4290, 1620, 375}, true);
+    list(lblSeqList, cmbSeqWfmList, "lblSeqList", "cmbSeqWfmList", " Sequences",
+         "Lists the sequences of aribtrary waveforms", {5985, 4845, 1515, 300},
+         {6030, 5160, 1620, 375}, false);
+
+    std::vector<ISizedControl*> controls;
+    for (const auto& c : m_oSized)
+        controls.push_back(c.get());
+    m_oSizing.Store(controls, height(), width());
+
+    m_oConfigTimer = CTimer::Create();
+    m_oConfigTimer->Interval(500);
+    m_cTick = m_oConfigTimer->Timer.Connect([this] { m_bConfigDue = true; });
+}
+
+XUIFgen1::~XUIFgen1() {
+    Quietly([&] { m_oConfigTimer->Enabled(false); });
+}
+
+QSize XUIFgen1::sizeHint() const {
+    return {Px(kDesignWidthTwips), Px(kDesignHeightTwips)};
+}
+
+// ---- The contract ------------------------------------------------------------------------------
+
+void XUIFgen1::Construct(CIviFgenIOImp* io, std::shared_ptr<CIviFgenPropImp> propSet,
+                         std::shared_ptr<CIviErrorReport> errorReport) {
+    m_oIO = io;
+    m_oErr = errorReport;
+    m_oDisplay->Construct(io, propSet, errorReport);
+    SetNewPropSet(std::move(propSet));
+    m_cConfigured = m_oIO->Configured.Connect([this] { OnConfigured(); });
+    m_cError = m_oIO->Error.Connect(
+        [this](std::int32_t, const std::string&, const std::string&) { OnError(); });
+    m_cInitialized = m_oErr->Initialized.Connect([this] { OnInitialized(); });
+}
+
+void XUIFgen1::SetNewPropSet(std::shared_ptr<CIviFgenPropImp> propSet) {
+    m_oProp = std::move(propSet);
+    if (m_oIO) m_oDisplay->SetNewPropSet(m_oProp);
+    m_cCollectionChanged = m_oProp->CollectionChanged.Connect(
+        [this](const std::string&, const Variant&, std::int32_t, const Variant&, const Variant&) {
+            OnCollectionChanged();
+        });
+}
+
+void XUIFgen1::Enabled(bool enabled) {
+    for (const auto& c : m_oSized)
+        c->Widget()->setEnabled(enabled);
+    ShowDecadeButtons(enabled);
+    qzbtnFunction[7]->setEnabled(true);
+    qzbtnFunction[8]->setEnabled(true);
+}
+
+void XUIFgen1::Size(float w, float h) {
+    resize(static_cast<int>(w), static_cast<int>(h));
+}
+
+std::int32_t XUIFgen1::UiState() const {
+    return m_oDisplay->UiState();
+}
+
+void XUIFgen1::UiState(std::int32_t state) {
+    if (state & 1) {
+        m_oDisplay->UiState(state);
+        return;
+    }
+    if (state & 4) OnInitialized();
+    if (state & 8) OnConfigured();
+    m_oDisplay->UiState(state);
+}
+
+void XUIFgen1::resizeEvent(QResizeEvent* event) {
+    QWidget::resizeEvent(event);
+    if (m_bResizing) return;
+    const Hold hold(m_bResizing);
+    // Below 1500 by 500 twips the text fields make room for the knobs.
+    const bool room = width() > Px(1500) && height() > Px(500);
+    for (int i : {1, 2, 0})
+        txtInput[i]->setVisible(room);
+    txtInput[3]->setVisible(room && !knobFgen[3]->isHidden()); // the duty cycle has its mode
+    std::vector<ISizedControl*> controls;
+    for (const auto& c : m_oSized)
+        controls.push_back(c.get());
+    Quietly([&] { m_oSizing.Resize(controls, height(), width()); });
+}
+
+void XUIFgen1::paintEvent(QPaintEvent*) {
+    QPainter target(this);
+    CPaintFlickerFree buffer;
+    QPainter* p = buffer.BeginPainting(target, *this);
+    buffer.EraseBackground(0x8000000F);
+    // A raised edge all round.
+    const QRectF r = QRectF(rect()).adjusted(0.5, 0.5, -0.5, -0.5);
+    p->setPen(palette().color(QPalette::Light));
+    p->drawLine(r.topLeft(), r.topRight());
+    p->drawLine(r.topLeft(), r.bottomLeft());
+    p->setPen(palette().color(QPalette::Dark));
+    p->drawLine(r.bottomLeft(), r.bottomRight());
+    p->drawLine(r.topRight(), r.bottomRight());
+    buffer.StopPainting();
+}
+
+// ---- Events ------------------------------------------------------------------------------------
+
+bool XUIFgen1::HasOutputExtension() const {
+    return m_oProp && (m_oProp->Extensions() &
+                       (qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt));
+}
+
+bool XUIFgen1::Ready() const {
+    return m_oErr && m_oErr->state() == IviStateConfigured && HasOutputExtension();
+}
+
+void XUIFgen1::OnInitialized() {
+    if (!HasOutputExtension()) return;
+    const Hold hold(m_bBusy);
+    Quietly([&] { EnableValidFunctions(false); });
+    Quietly([&] { UpdateModeControls(true); });
+}
+
+void XUIFgen1::OnConfigured() {
+    if (!HasOutputExtension()) return;
+    const Hold hold(m_bBusy);
+    Quietly([&] { EnableValidFunctions(true); });
+    Quietly([&] { UpdateRanges(); });
+    Quietly([&] {
+        const std::int32_t mode = m_oProp->OutputMode(), ext = m_oProp->Extensions();
+        const bool channels = m_oProp->Channels()->Count() > 0;
+        if (mode == qzivifgenOutputFunc && (ext & qzivifgenStdFuncExt)) {
+            const int n = Set(m_oProp->Channels()->ActiveChannel()).FuncWaveform();
+            PressFunctionButton(n);
+            ShowControlsForFunction(n);
+            if (m_oProp->Waveforms()->Count() > 0)
+                FillList(true);
+            else
+                cmbArbWfmList->setCurrentIndex(-1);
+            if (m_oProp->Sequences()->Count() > 0)
+                FillList(false);
+            else
+                cmbSeqWfmList->setCurrentIndex(-1);
+        } else if (mode == qzivifgenOutputArb && (ext & qzivifgenArbWfmExt)) {
+            FillList(true);
+            PressFunctionButton(channels ? 7 : 0);
+            ShowControlsForFunction(channels ? 7 : 0);
+        } else if (mode == qzivifgenOutputSeq && (ext & qzivifgenArbSeqExt)) {
+            FillList(true);
+            FillList(false);
+            PressFunctionButton(channels ? 8 : 0);
+            ShowControlsForFunction(channels ? 8 : 0);
+        }
+    });
+}
+
+void XUIFgen1::OnError() {
+    const Hold hold(m_bBusy);
+    for (int i = 1; i <= 8; ++i)
+        qzbtnFunction[i]->Value(false);
+}
+
+void XUIFgen1::OnCollectionChanged() {
+    if (m_bBusy) return;
+    const Hold hold(m_bBusy);
+    if (!m_oErr || m_oErr->state() != IviStateConfigured) return;
+    Quietly([&] {
+        if (m_oProp->Channels()->Count() < 1) {
+            ResetToNoChannels();
+            return;
+        }
+        const std::int32_t mode = m_oProp->OutputMode(), ext = m_oProp->Extensions();
+        const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+        if (mode == qzivifgenOutputFunc && (ext & qzivifgenStdFuncExt)) {
+            PressFunctionButton(channel.FuncWaveform());
+            ShowControlsForFunction(channel.FuncWaveform());
+        } else if (mode == qzivifgenOutputArb && (ext & qzivifgenArbWfmExt)) {
+            PressFunctionButton(7);
+            ShowControlsForFunction(7);
+            cmbArbWfmList->setCurrentText(
+                QString::fromStdString(Set(channel.ArbWaveform()).Name()));
+        } else if (mode == qzivifgenOutputSeq && (ext & qzivifgenArbSeqExt)) {
+            PressFunctionButton(8);
+            ShowControlsForFunction(8);
+            cmbSeqWfmList->setCurrentText(QString::fromStdString(Set(channel.Sequence()).Name()));
+        }
+        RefreshFromProperties();
+    });
+}
+
+// ---- Operator's actions ------------------------------------------------------------------------
+
+template <typename F>
+void XUIFgen1::Act(F&& action) {
+    try {
+        action();
+    } catch (...) {
+        HandleError("", 0, m_oErr.get());
+    }
+}
+
+void XUIFgen1::FunctionClick(int index) {
+    Act([&] {
+        PressFunctionButton(index);
+        if (m_oProp->Channels()->Count() < 1 || !Ready()) return;
+        if (!m_bBusy) {
+            const Hold hold(m_bBusy);
+            double f = 0;
+            auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+            if (index == 7 || index == 8) {
+                FillList(index == 7);
+                m_oProp->OutputMode(index == 7 ? qzivifgenOutputArb : qzivifgenOutputSeq);
+                m_oIO->Configure(false);
+                UpdateRanges();
+                f = GetArbFrequency();
+            } else {
+                m_oProp->OutputMode(qzivifgenOutputFunc);
+                channel.FuncWaveform(index);
+                m_oIO->Configure(false);
+                UpdateRanges();
+                f = channel.FuncFrequency();
+            }
+            ShowValue(0, f);
+        }
+        ShowControlsForFunction(index);
+    });
+}
+
+void XUIFgen1::KnobPressed() {
+    Act([&] {
+        m_oConfigTimer->Enabled(true);
+        m_oProp->DraggingKnob(true);
+    });
+}
+
+void XUIFgen1::KnobReleased() {
+    Act([&] {
+        m_oConfigTimer->Enabled(false);
+        m_oProp->DraggingKnob(false);
+    });
+}
+
+void XUIFgen1::KnobChanged(int index, double value) {
+    Act([&] {
+        if (!m_oErr || m_oErr->state() != IviStateConfigured || m_oProp->Channels()->Count() < 1)
+            return;
+        WriteValue(index, value);
+        m_oDisplay->UpdateChannelInfo();
+        ShowValue(index, value);
+        if (!m_bBusy && m_bConfigDue) {
+            m_bConfigDue = false;
+            m_oIO->Configure(false);
+        }
+    });
+}
+
+void XUIFgen1::KnobCommitted(int index, double value) {
+    Act([&] {
+        if (!m_oErr || m_oProp->Channels()->Count() < 1) return;
+        if (m_oErr->state() == IviStateConfigured && !m_bBusy) {
+            WriteValue(index, value);
+            ShowValue(index, value);
+            m_oIO->Configure(false);
+        }
+        // The first change after Init, or after a Configure that failed, configures too.
+        if (m_oErr->state() == IviStateInitialized) {
+            WriteValue(index, value);
+            ShowValue(index, value);
+            m_oIO->Configure(false);
+        }
+    });
+}
+
+void XUIFgen1::DecadeClick(int index) {
+    Act([&] {
+        if (m_oProp->Channels()->Count() < 1 || !Ready()) return;
+        QZKnob& knob = *knobFgen[0];
+        const double old = knob.Value(), low = knob.Minimum(), high = knob.Maximum();
+        double next = 0;
+        if (index == 1) {
+            const bool atLimit = low / 10 <= m_vFreqRange.at(0);
+            SetKnobAxis(0, low / 10, low);
+            next = ClampFrequency(atLimit ? m_vFreqRange.at(0) : old / 10);
+        } else {
+            const bool atLimit = 10 * high >= m_vFreqRange.at(1);
+            SetKnobAxis(0, atLimit ? high : low * 10, atLimit ? 10 * high : low * 100);
+            next = ClampFrequency(atLimit ? m_vFreqRange.at(1) : old * 10);
+        }
+        ShowDecadeButtons(m_bDecadesOn);
+        ShowDecadeLabels(knob.Minimum());
+        knob.Value(next);
+        KnobCommitted(0, next);
+    });
+}
+
+void XUIFgen1::ListPicked(bool waveforms) {
+    Act([&] {
+        QComboBox& combo = waveforms ? *cmbArbWfmList : *cmbSeqWfmList;
+        if ((!waveforms || m_oProp->Channels()->Count() >= 1) && !m_bBusy) {
+            const Hold hold(m_bBusy);
+            auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+            const std::string name = combo.currentText().toStdString();
+            if (waveforms)
+                channel.ArbWaveform(m_oProp->Waveforms()->Item(name));
+            else
+                channel.Sequence(m_oProp->Sequences()->Item(name));
+            m_oIO->Configure(false);
+        }
+        if (waveforms && m_oProp->Waveforms()->Count() < 1) combo.setCurrentIndex(-1);
+    });
+}
+
+// ---- Controls by mode --------------------------------------------------------------------------
+
+void XUIFgen1::EnableValidFunctions(bool keepStandard) {
+    const auto valid = m_oIO->IVIFgenGetValidFunctions(keepStandard);
+    bool any = false;
+    for (int i = 1; i <= 8; ++i) {
+        const bool on = valid[static_cast<std::size_t>(i - 1)].AsInt32() != 0;
+        qzbtnFunction[i]->setEnabled(on);
+        any = any || on;
+    }
+    UpdateModeControls(any);
+}
+
+void XUIFgen1::PressFunctionButton(int n) {
+    for (int i = 1; i <= 8; ++i)
+        qzbtnFunction[i]->Value(i == n);
+}
+
+// A decade button works while the knob's decade has another beyond it within the driver's range.
+void XUIFgen1::ShowDecadeButtons(bool on) {
+    m_bDecadesOn = on;
+    const bool known = m_vFreqRange.size() >= 2;
+    constexpr double kSlack = 1e-9; // decades are stepped by tens and may miss the limit by an ulp
+    const bool top = known && knobFgen[0]->Maximum() >= m_vFreqRange[1] * (1 - kSlack);
+    const bool bottom = known && knobFgen[0]->Minimum() <= m_vFreqRange[0] * (1 + kSlack);
+    for (int i = 0; i < 2; ++i) {
+        const bool enabled = on && !(i == 0 ? top : bottom);
+        cmdMulFactor[i]->setEnabled(enabled);
+        cmdMulFactor[i]->setIcon(m_oArrows[(enabled ? 2 : 0) + i]);
+    }
+}
+
+void XUIFgen1::ShowControlsForFunction(int n) {
+    for (int i = 0; i < 6; ++i) {
+        lblFgen[i]->setVisible(true);
+        lblFgen[i]->Enabled(true);
+    }
+    for (int i = 0; i < 4; ++i) {
+        knobFgen[i]->setEnabled(true);
+        knobFgen[i]->setVisible(true);
+        txtInput[i]->setEnabled(true);
+    }
+    ResetModeControls();
+    switch (n) {
+    case 2: // only the square wave has a duty cycle
+        knobFgen[3]->setEnabled(true);
+        lblFgen[3]->Enabled(true);
+        txtInput[3]->setEnabled(true);
+        break;
+    case 6: // DC leaves the offset
+        for (int i : {0, 2, 3})
+            knobFgen[i]->setEnabled(false);
+        for (int i = 0; i < 4; ++i) {
+            txtInput[i]->setEnabled(false);
+            lblFgen[i]->Enabled(false);
+        }
+        lblFgen[1]->Enabled(true);
+        txtInput[1]->setEnabled(true);
+        ShowDecadeButtons(false);
+        lblFgen[4]->Enabled(false);
+        lblFgen[5]->Enabled(false);
+        break;
+    case 7:
+    case 8: {
+        const bool waveforms = n == 7;
+        const std::int32_t count =
+            waveforms ? m_oProp->Waveforms()->Count() : m_oProp->Sequences()->Count();
+        if (count < 1) {
+            UpdateModeControls(false);
+        } else {
+            (waveforms ? lblArbList : lblSeqList)->Enabled(true);
+            (waveforms ? cmbArbWfmList : cmbSeqWfmList)->setEnabled(true);
+            UpdateModeControls(m_oProp->Channels()->Count() > 0);
+        }
+        break;
+    }
+    default:
+        break;
+    }
+}
+
+void XUIFgen1::ResetModeControls() {
+    txtInput[3]->setVisible(m_oProp->OutputMode() == qzivifgenOutputFunc);
+    lblFgen[3]->Enabled(false);
+    knobFgen[3]->setEnabled(false);
+    txtInput[3]->setEnabled(false);
+    lblArbList->Enabled(false);
+    lblSeqList->Enabled(false);
+    cmbArbWfmList->setEnabled(false);
+    cmbSeqWfmList->setEnabled(false);
+    ShowDecadeButtons(true);
+}
+
+void XUIFgen1::UpdateModeControls(bool enable) {
+    const std::int32_t mode = m_oProp->OutputMode(), ext = m_oProp->Extensions();
+    const bool modeOk = (mode == qzivifgenOutputFunc && (ext & qzivifgenStdFuncExt)) ||
+                        (mode == qzivifgenOutputArb && (ext & qzivifgenArbWfmExt)) ||
+                        (mode == qzivifgenOutputSeq && (ext & qzivifgenArbSeqExt));
+    if (mode == qzivifgenOutputArb) {
+        cmbSeqWfmList->setEnabled(false);
+        lblSeqList->Enabled(false);
+    } else if (mode == qzivifgenOutputSeq) {
+        cmbArbWfmList->setEnabled(false);
+        lblArbList->Enabled(false);
+    }
+    SetModeCaptions();
+    if (m_oProp->Channels()->Count() < 1) {
+        for (QComboBox* combo : {cmbArbWfmList, cmbSeqWfmList}) {
+            combo->setCurrentIndex(-1);
+            combo->setEnabled(false);
+        }
+        lblArbList->Enabled(false);
+        lblSeqList->Enabled(false);
+    }
+    const bool on = enable && modeOk;
+    for (int i = 0; i < 4; ++i) {
+        knobFgen[i]->setEnabled(on);
+        txtInput[i]->setEnabled(on);
+    }
+    for (int i = 0; i < 6; ++i)
+        lblFgen[i]->Enabled(on);
+    const bool duty = mode == qzivifgenOutputFunc && on;
+    lblFgen[3]->setVisible(duty);
+    knobFgen[3]->setVisible(duty);
+    txtInput[3]->setVisible(duty);
+    ShowDecadeButtons(on);
+}
+
+void XUIFgen1::SetModeCaptions() {
+    switch (m_oProp->OutputMode()) {
+    case qzivifgenOutputFunc:
+        lblFgen[0]->Caption("Frequency");
+        lblFgen[1]->Caption("DC Offset");
+        lblFgen[2]->Caption("Amplitude");
+        lblFgen[3]->Caption(" Duty Cycle");
+        break;
+    case qzivifgenOutputArb:
+    case qzivifgenOutputSeq:
+        lblFgen[0]->Caption("Frequency");
+        lblFgen[1]->Caption("Arb Offset");
+        lblFgen[2]->Caption(" Arb Gain");
+        break;
+    default:
+        break;
+    }
+}
+
+void XUIFgen1::FillList(bool waveforms) {
+    QComboBox& combo = waveforms ? *cmbArbWfmList : *cmbSeqWfmList;
+    XWinLabel& label = waveforms ? *lblArbList : *lblSeqList;
+    combo.clear();
+    auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    const std::int32_t count =
+        waveforms ? m_oProp->Waveforms()->Count() : m_oProp->Sequences()->Count();
+    if (count > 0) {
+        combo.setVisible(true);
+        label.setVisible(true);
+        for (std::int32_t i = 1; i <= count; ++i)
+            combo.addItem(QString::fromStdString(waveforms ? m_oProp->Waveforms()->At(i)->Name()
+                                                           : m_oProp->Sequences()->At(i)->Name()));
+        const bool none = waveforms ? !channel.ArbWaveform() : !channel.Sequence();
+        if (none) {
+            combo.setCurrentIndex(0);
+            const std::string name = combo.currentText().toStdString();
+            if (waveforms)
+                channel.ArbWaveform(m_oProp->Waveforms()->Item(name));
+            else
+                channel.Sequence(m_oProp->Sequences()->Item(name));
+        } else {
+            combo.setCurrentText(QString::fromStdString(waveforms ? channel.ArbWaveform()->Name()
+                                                                  : channel.Sequence()->Name()));
+        }
+    } else {
+        combo.setCurrentIndex(-1);
+    }
+    EnableActiveList();
+}
+
+void XUIFgen1::EnableActiveList() {
+    if (m_oProp->Channels()->Count() < 1) return;
+    const std::int32_t mode = m_oProp->OutputMode(), ext = m_oProp->Extensions();
+    if ((ext & qzivifgenArbWfmExt) && mode == qzivifgenOutputArb) {
+        cmbArbWfmList->setEnabled(true);
+    } else if ((ext & qzivifgenArbSeqExt) && mode == qzivifgenOutputSeq) {
+        cmbSeqWfmList->setEnabled(true);
+    } else if (mode == qzivifgenOutputArb && (ext & qzivifgenStdFuncExt)) {
+        cmbArbWfmList->setEnabled(false);
+        cmbSeqWfmList->setEnabled(false);
+    }
+}
+
+void XUIFgen1::ResetToNoChannels() {
+    for (int i : {0, 2, 1, 3})
+        ShowValue(i, 0);
+    const double base = DecadeBase(1.0);
+    SetKnobAxis(0, base, 10 * base);
+    ShowDecadeLabels(base);
+    for (int i : {2, 1, 3})
+        knobFgen[i]->Value(0);
+    for (QComboBox* combo : {cmbArbWfmList, cmbSeqWfmList}) {
+        combo->setEnabled(true);
+        combo->setCurrentIndex(-1);
+    }
+    PressFunctionButton(99);
+    Enabled(true);
+}
+
+// ---- Values ------------------------------------------------------------------------------------
+
+double XUIFgen1::GetArbFrequency() const {
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    if (m_oProp->Extensions() & qzivifgenArbFrequencyExt) return channel.ArbFrequency();
+    const std::int32_t size = Set(channel.ArbWaveform()).DataSize();
+    if (size == 0) RaiseRuntime(runtime::kDivisionByZero, "Division by zero.");
+    return m_oProp->ArbSampleRate() / size;
+}
+
+void XUIFgen1::SetArbFrequency(double value) {
+    auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    if (m_oProp->Extensions() & qzivifgenArbFrequencyExt)
+        channel.ArbFrequency(value);
+    else
+        m_oProp->ArbSampleRate(value * Set(channel.ArbWaveform()).DataSize());
+}
+
+// The property of a knob in the present mode.
+void XUIFgen1::WriteValue(int index, double value) {
+    auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    const bool function = m_oProp->OutputMode() == qzivifgenOutputFunc;
+    switch (index) {
+    case 0:
+        function ? channel.FuncFrequency(value) : SetArbFrequency(value);
+        break;
+    case 1:
+        function ? channel.FuncDCOffset(value) : channel.ArbOffset(value);
+        break;
+    case 2:
+        function ? channel.FuncAmplitude(value) : channel.ArbGain(value);
+        break;
+    case 3:
+        if (function) channel.FuncDutyCycleHigh(value);
+        break;
+    default:
+        break;
+    }
+}
+
+double XUIFgen1::PropertyOf(bool arbMode, int index) const {
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    switch (index) {
+    case 0:
+        return arbMode ? GetArbFrequency() : channel.FuncFrequency();
+    case 1:
+        return arbMode ? channel.ArbOffset() : channel.FuncDCOffset();
+    case 2:
+        return arbMode ? channel.ArbGain() : channel.FuncAmplitude();
+    default:
+        return channel.FuncDutyCycleHigh();
+    }
+}
+
+void XUIFgen1::SetKnobAxis(int index, double minimum, double maximum) {
+    knobFgen[index]->Minimum(minimum);
+    knobFgen[index]->Maximum(maximum);
+}
+
+void XUIFgen1::UpdateRanges() {
+    const bool arbMode = m_oProp->OutputMode() != qzivifgenOutputFunc;
+    const std::string name = Set(m_oProp->Channels()->ActiveChannel()).Name();
+    if (!arbMode) {
+        m_vFreqRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_FUNC_FREQUENCY, "");
+        m_vAmplitudeRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_FUNC_AMPLITUDE, name);
+        m_vDutyRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH, name);
+        m_vDCOffsetRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_FUNC_DC_OFFSET, name);
+    } else {
+        m_vFreqRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_ARB_FREQUENCY, "");
+        m_vArbGainRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_ARB_GAIN, name);
+        m_vArbOffsetRange = m_oIO->IviFgenGetRanges(IVIFGEN_ATTR_ARB_OFFSET, name);
+    }
+    const double base = DecadeBase(PropertyOf(arbMode, 0));
+    SetKnobAxis(0, base, base * 10);
+    ShowDecadeLabels(base);
+    ClampKnobToProperty(arbMode, 0, base, base * 10);
+    ShowDecadeButtons(m_bDecadesOn);
+    const auto apply = [&](int index, const std::vector<double>& range) {
+        SetKnobAxis(index, range.at(0), range.at(1));
+        ClampKnobToProperty(arbMode, index, range.at(0), range.at(1));
+    };
+    if (!arbMode) {
+        apply(2, m_vAmplitudeRange);
+        apply(3, m_vDutyRange);
+        apply(1, m_vDCOffsetRange);
+    } else {
+        apply(2, m_vArbGainRange);
+        apply(1, m_vArbOffsetRange);
+    }
+}
+
+void XUIFgen1::ClampKnobToProperty(bool arbMode, int index, double minimum, double maximum) {
+    const double property = PropertyOf(arbMode, index);
+    knobFgen[index]->Value(property < minimum ? minimum : property <= maximum ? property : maximum);
+    ShowValue(index, knobFgen[index]->Value());
+}
+
+void XUIFgen1::RefreshFromProperties() {
+    const bool function = m_oProp->OutputMode() == qzivifgenOutputFunc;
+    const auto& channel = Set(m_oProp->Channels()->ActiveChannel());
+    knobFgen[0]->Value(function ? channel.FuncFrequency() : GetArbFrequency());
+    const double base = DecadeBase(knobFgen[0]->Value());
+    SetKnobAxis(0, base, 10 * base);
+    if (function) {
+        knobFgen[1]->Value(channel.FuncDCOffset());
+        knobFgen[2]->Value(channel.FuncAmplitude());
+        knobFgen[3]->Value(channel.FuncDutyCycleHigh());
+        PressFunctionButton(channel.FuncWaveform());
+    } else {
+        knobFgen[1]->Value(channel.ArbOffset());
+        knobFgen[2]->Value(channel.ArbGain());
+        PressFunctionButton(m_oProp->OutputMode() == qzivifgenOutputArb ? 7 : 8);
+    }
+    ShowDecadeLabels(knobFgen[0]->Minimum());
+    ShowDecadeButtons(m_bDecadesOn);
+}
+
+double XUIFgen1::DecadeBase(double value) {
+    if (m_vFreqRange.size() < 2) UpdateRanges();
+    double base = m_vFreqRange.at(0);
+    if (value < base) return base;
+    while (base * 10 < value && base * 10 < m_vFreqRange.at(1))
+        base *= 10;
+    return base;
+}
+
+double XUIFgen1::ClampFrequency(double value) {
+    try {
+        if (m_vFreqRange.size() < 2) UpdateRanges();
+        if (value >= m_vFreqRange.at(1)) return m_vFreqRange.at(1);
+        if (value <= m_vFreqRange.at(0)) return m_vFreqRange.at(0);
+        return value;
+    } catch (...) {
+        HandleError("", 0, m_oErr.get());
+        return 0;
+    }
+}
+
+void XUIFgen1::ShowValue(int index, double value) {
+    std::string text;
+    double parsed = 0;
+    if (index == 0) {
+        text = m_oDisplay->GetFormattedReading(value);
+    } else if (index == 2 && m_oProp->OutputMode() != qzivifgenOutputFunc) {
+        char buffer[64];
+        std::snprintf(buffer, sizeof buffer, "%.2f", value);
+        text = buffer;
+    } else {
+        FormatValueWithUnit(text::FormatNumber(value), text, parsed, kUnits[index],
+                            kDecimals[index]);
+    }
+    txtInput[index]->setText(QString::fromStdString(text));
+    txtInput[index]->setCursorPosition(0); // a long reading shows its first digits
+    QString tip = QString::fromStdString(text);
+    if (index == 0 && m_oProp->OutputMode() != qzivifgenOutputFunc &&
+        !(m_oProp->Extensions() & qzivifgenArbFrequencyExt))
+        tip = "ArbFrequency = " + tip + "  (ArbFrequency = ArbSampleRate/ArbWaveformDataSize)";
+    knobFgen[index]->setToolTip(tip);
+}
+
+void XUIFgen1::ShowDecadeLabels(double base) {
+    lblFgen[4]->Caption(m_oDisplay->GetFormattedReading(base, true));
+    lblFgen[5]->Caption(m_oDisplay->GetFormattedReading(base * 10, true));
+}
+
+// ---- Text entry --------------------------------------------------------------------------------
+
+int XUIFgen1::FieldIndex(QObject* object) const {
+    for (int i = 0; i < 4; ++i)
+        if (object == txtInput[i]) return i;
+    return -1;
+}
+
+bool XUIFgen1::eventFilter(QObject* watched, QEvent* event) {
+    if (watched == m_oDisplay && event->type() == QEvent::FocusIn && m_bEditing) {
+        txtInput[m_iEditIndex]->setFocus(); // the edit is not settled
+        return false;
+    }
+    if ((watched == cmbArbWfmList || watched == cmbSeqWfmList) &&
+        event->type() == QEvent::FocusOut) {
+        const bool waveforms = watched == cmbArbWfmList;
+        Quietly([&] {
+            if ((waveforms ? m_oProp->Waveforms()->Count() : m_oProp->Sequences()->Count()) == 0)
+                static_cast<QComboBox*>(watched)->setCurrentIndex(-1);
+        });
+        return false;
+    }
+    const int index = FieldIndex(watched);
+    if (index < 0) return QWidget::eventFilter(watched, event);
+    switch (event->type()) {
+    case QEvent::FocusIn:
+        m_sSavedText = txtInput[index]->text().toStdString();
+        break;
+    case QEvent::MouseButtonPress:
+        if (m_sSavedText.empty()) m_sSavedText = txtInput[index]->text().toStdString();
+        break;
+    case QEvent::KeyPress: {
+        const int key = static_cast<QKeyEvent*>(event)->key();
+        FieldKey(index, key);
+        if (key == Qt::Key_Return || key == Qt::Key_Enter) return true; // dropped
+        if (key == Qt::Key_Escape) return true;
+        break;
+    }
+    case QEvent::FocusOut:
+        FieldLeft(index);
+        break;
+    default:
+        break;
+    }
+    return false;
+}
+
+void XUIFgen1::FieldKey(int index, int key) {
+    QLineEdit& field = *txtInput[index];
+    if (!Ready()) {
+        if (key == Qt::Key_Escape) {
+            m_bTextDone = true;
+            knobFgen[index]->setFocus();
+        }
+        return;
+    }
+    if (key == Qt::Key_Escape) {
+        field.setText(QString::fromStdString(m_sSavedText));
+        m_bTextDirty = false;
+        m_bTextDone = true;
+        knobFgen[index]->setFocus();
+        return;
+    }
+    m_bTextDirty = true;
+    m_bEditing = true;
+    m_iEditIndex = index;
+    if (key == Qt::Key_Return || key == Qt::Key_Enter) {
+        m_bTextDone = true;
+        m_bEditing = false;
+        CommitField(index);
+    }
+}
+
+// The focus has gone: a changed field without Enter takes it back until Enter or Esc.
+void XUIFgen1::FieldLeft(int index) {
+    QLineEdit& field = *txtInput[index];
+    const std::string text = field.text().toStdString();
+    if (m_bTextDirty && !m_bTextDone) {
+        if (text != m_sSavedText) {
+            m_bTextDone = false;
+            field.setFocus();
+            return;
+        }
+        if (!m_sSavedText.empty()) field.setText(QString::fromStdString(m_sSavedText));
+        m_bTextDirty = false;
+        m_bTextDone = true;
+    }
+    if (m_bEditing) {
+        field.setText(QString::fromStdString(m_sSavedText));
+        m_bEditing = false;
+        m_bTextDirty = false;
+        m_bTextDone = true;
+        return;
+    }
+    if (!m_bTextDirty && !m_sSavedText.empty()) field.setText(QString::fromStdString(m_sSavedText));
+    m_bTextDone = false;
+    m_bTextDirty = false;
+}
+
+void XUIFgen1::CommitField(int index) {
+    Act([&] {
+        std::string text;
+        double value = 0;
+        FormatValueWithUnit(txtInput[index]->text().toStdString(), text, value, kUnits[index],
+                            kDecimals[index]);
+        QZKnob& knob = *knobFgen[index];
+        if (index == 0) {
+            const double clamped = ClampFrequency(value);
+            knob.Value(clamped);
+            KnobCommitted(0, clamped);
+            const double base = DecadeBase(knob.Value());
+            SetKnobAxis(0, base, 10 * base);
+            ShowDecadeLabels(base);
+            ShowDecadeButtons(m_bDecadesOn);
+        } else {
+            knob.Value(value);
+            KnobCommitted(index, value);
+        }
+        ShowValue(index, knob.Value());
+        m_sSavedText = txtInput[index]->text().toStdString();
+        knob.setFocus();
+    });
+}
+
+} // namespace qzivi
