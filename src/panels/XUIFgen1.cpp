@@ -1,5 +1,7 @@
 #include "qzivi/panels/XUIFgen1.h"
 
+#include "PanelSteps.h"
+
 #include "qzivi/driver/CIviErrorReport.h"
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/engine/CIviFgenIOImp.h"
@@ -28,26 +30,9 @@
 
 namespace qzivi {
 
+using namespace panel;
+
 namespace {
-
-int Px(int twips) {
-    return static_cast<int>(std::lround(TwipsToPixels(twips)));
-}
-
-template <typename F>
-void Quietly(F&& step) {
-    try {
-        step();
-    } catch (...) {
-    }
-}
-
-// An object the panel goes through: none is the failure of an unset object (91).
-template <typename T>
-T& Set(const std::shared_ptr<T>& object) {
-    if (!object) RaiseRuntime(91, "Object variable not set.");
-    return *object;
-}
 
 // A flag held for the length of a scope, cleared on every way out.
 struct Hold {

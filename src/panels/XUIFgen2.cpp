@@ -1,5 +1,7 @@
 #include "qzivi/panels/XUIFgen2.h"
 
+#include "PanelSteps.h"
+
 #include "qzivi/driver/CIviErrorReport.h"
 #include "qzivi/engine/CIviFgenIOImp.h"
 #include "qzivi/model/CIviFgenPropImp.h"
@@ -20,31 +22,12 @@
 
 namespace qzivi {
 
+using namespace panel;
+
 namespace {
-
-int Px(int twips) {
-    return static_cast<int>(std::lround(TwipsToPixels(twips)));
-}
-
-// A step of an event handler whose failure leaves its label or plot as it was.
-template <typename F>
-void Quietly(F&& step) {
-    try {
-        step();
-    } catch (...) {
-    }
-}
 
 QString Q(const std::string& text) {
     return QString::fromStdString(text);
-}
-
-// An object the panel goes through: none is the failure of an unset object (91), which the
-// handler's step then ignores, as it ignores every other.
-template <typename T>
-T& Set(const std::shared_ptr<T>& object) {
-    if (!object) RaiseRuntime(91, "Object variable not set.");
-    return *object;
 }
 
 // The font of a label made smaller, down to half its size, until its text fits its width.

@@ -124,6 +124,18 @@ private slots:
         QCOMPARE(Child<QComboBox>("cmbArbWfmList")->currentText(), QStringLiteral("Ramp"));
         QVERIFY(Child<QComboBox>("cmbArbWfmList")->isEnabled());
         QVERIFY(!Child<QComboBox>("cmbSeqWfmList")->isEnabled());
+
+        Control().Sequences()->Add("Twice")->Add(Control().Waveforms()->Item(1), 2);
+        Control().Configure();
+        trace.Clear();
+        QTest::mouseClick(Function(8), Qt::LeftButton);
+        QCOMPARE(Pressed(), 8);
+        QCOMPARE(Control().OutputMode(), qzivifgenOutputSeq);
+        const auto sequenced = trace.Functions();
+        QVERIFY(std::find(sequenced.begin(), sequenced.end(), "IviFgen_CreateArbSequence") !=
+                sequenced.end());
+        QCOMPARE(Child<QComboBox>("cmbSeqWfmList")->currentText(), QStringLiteral("Twice"));
+        QVERIFY(!Knob(3)->isVisible()); // no duty cycle outside the standard functions
     }
 
     void aTwoSecondDragConfiguresAtMostTwiceASecondAndTheFinalValueOnce() {
