@@ -425,13 +425,9 @@ void XUIFgen1::KnobChanged(int index, double value) {
 void XUIFgen1::KnobCommitted(int index, double value) {
     Act([&] {
         if (!m_oErr || m_oProp->Channels()->Count() < 1) return;
-        if (m_oErr->state() == IviStateConfigured && !m_bBusy) {
-            WriteValue(index, value);
-            ShowValue(index, value);
-            m_oIO->Configure(false);
-        }
         // The first change after Init, or after a Configure that failed, configures too.
-        if (m_oErr->state() == IviStateInitialized) {
+        const std::int32_t state = m_oErr->state();
+        if ((state == IviStateConfigured && !m_bBusy) || state == IviStateInitialized) {
             WriteValue(index, value);
             ShowValue(index, value);
             m_oIO->Configure(false);

@@ -248,6 +248,18 @@ private slots:
         QVERIFY(refused(bottom / 1.5));
     }
 
+    void theFirstTurnAfterInitConfigures() {
+        Control().Init();
+        int runs = 0;
+        const auto counted = Control().Configured.Connect([&] { ++runs; });
+        QVERIFY(Knob(2)->isEnabled());
+        const double before = Control().Channels()->Item(1)->FuncAmplitude();
+        QTest::keyClick(Knob(2), Qt::Key_Up);
+        QCOMPARE(runs, 1);
+        QVERIFY(Control().Channels()->Item(1)->FuncAmplitude() != before);
+        QCOMPARE(Control().Channels()->Item(1)->FuncAmplitude(), Knob(2)->Value());
+    }
+
     void dcLeavesOnlyTheOffset() {
         Control().Configure();
         QTest::mouseClick(Function(6), Qt::LeftButton);
