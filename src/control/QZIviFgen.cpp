@@ -35,6 +35,10 @@ QZIviFgen::~QZIviFgen() {
     }
     m_oUI.reset();
     try {
+        ReleaseCopy(true);
+    } catch (...) {
+    }
+    try {
         m_oProp->Detach();
     } catch (...) {
     }
@@ -60,6 +64,16 @@ auto QZIviFgen::Frame(const char* source, F&& body) -> decltype(body()) {
     } catch (...) {
         HandleError(source, m_oProp->ExceptionOnError() ? -1 : 0, m_oErr.get());
         if constexpr (!std::is_void_v<decltype(body())>) return {};
+    }
+}
+
+template <typename F>
+auto QZIviFgen::PageFrame(const char* source, F&& body) -> decltype(body()) {
+    try {
+        return body();
+    } catch (...) {
+        HandleError(source, -1, nullptr);
+        throw; // not reached: mode -1 raises
     }
 }
 
@@ -394,6 +408,56 @@ void QZIviFgen::Property(const std::string& name, const PropertyValue& value) {
 
 std::int32_t QZIviFgen::SessionHandle() {
     return Frame("SessionHandle", [&] { return static_cast<std::int32_t>(m_oErr->hSession()); });
+}
+
+// ---- The property pages' link -----------------------------------------------------------------
+
+std::shared_ptr<CIviFgenPropImp> QZIviFgen::PropCopy() {
+    return PageFrame("PropCopy", [&] { return m_oPropCopy; });
+}
+
+std::int32_t QZIviFgen::LastChangeIndex() {
+    return PageFrame("LastChangeIndex", [&] { return m_nLastChangeIndex; });
+}
+
+std::int32_t QZIviFgen::IncrementLastChangeIndex() {
+    return PageFrame("IncrementLastChangeIndex",
+                     [&] { return m_nLastChangeIndex = NextChangeIndex(m_nLastChangeIndex); });
+}
+
+void QZIviFgen::RegisterSelectionChanged() {
+    PageFrame("RegisterSelectionChanged", [&] {
+        // Pages opened together share one copy; it is not refreshed from the live set meanwhile.
+        if (++m_nCopyUsers == 1) m_oPropCopy = m_oProp->Clone(nullptr);
+    });
+}
+
+void QZIviFgen::RegisterApplyChanges() {
+    PageFrame("RegisterApplyChanges", [&] {
+        auto next = m_oPropCopy->Clone(nullptr);
+        next->SetPath(m_sDisplayName);
+        if (m_oUI) m_oUI->SetNewPropSet(next);
+        m_oIO->SetNewPropSet(next);
+        const bool wasEnabled = m_oProp->Enabled();
+        m_cPropertyChange.Disconnect();
+        m_oProp->Detach();
+        m_oProp = std::move(next);
+        ConnectPropertySet();
+        const bool enabled = m_oProp->Enabled();
+        SetUiStyle(m_oProp->UIStyle());
+        if (wasEnabled != enabled) RefreshPanel();
+        if (m_oHost) m_oHost->PropertyChanged(""); // the host asks for everything again
+    });
+}
+
+void QZIviFgen::ReleaseCopy(bool force) {
+    PageFrame("ReleaseCopy", [&] {
+        m_nCopyUsers = force ? 0 : std::max(0, m_nCopyUsers - 1);
+        if (m_nCopyUsers == 0 && m_oPropCopy) {
+            m_oPropCopy->Detach();
+            m_oPropCopy.reset();
+        }
+    });
 }
 
 } // namespace qzivi

@@ -83,8 +83,7 @@ QZIviFgenWidget::QZIviFgenWidget(QWidget* parent, bool userMode)
     connect(this, &QObject::objectNameChanged, this,
             [this] { m_oControl->AmbientChanged("DisplayName"); });
     m_oControl->InitProperties();
-    for (const auto& row : CIviFgenPropImp::Properties())
-        PublishRootProperty(std::string(row.name));
+    PublishRootProperty("");
 }
 
 QZIviFgenWidget::~QZIviFgenWidget() {
@@ -132,6 +131,11 @@ void QZIviFgenWidget::PropertyChanged(const std::string& name) {
 }
 
 void QZIviFgenWidget::PublishRootProperty(const std::string& name) {
+    if (name.empty()) { // "some": every row, as after an apply from the pages
+        for (const auto& each : CIviFgenPropImp::Properties())
+            PublishRootProperty(std::string(each.name));
+        return;
+    }
     const auto* row = RootRow(name);
     if (!row || !m_oControl) return;
     m_bPublishing = true;
@@ -183,8 +187,7 @@ void QZIviFgenWidget::SetPropertyBagContents(const QByteArray& contents) {
         return;
     }
     m_oControl->ReadProperties(bag);
-    for (const auto& row : CIviFgenPropImp::Properties())
-        PublishRootProperty(std::string(row.name));
+    PublishRootProperty("");
 }
 
 void QZIviFgenWidget::ShowAboutBox() {

@@ -2,8 +2,7 @@
 // the control sizes and shows itself, the swap of styles, and the start-up configure on the
 // std-only tick loop.
 #include "../platform/test_support.h"
-#include "qzivi/control/Host.h"
-#include "qzivi/control/Panel.h"
+#include "fake_host.h"
 #include "qzivi/control/QZIviFgen.h"
 #include "qzivi/model/PropertyBag.h"
 #include "qzivi/support/failure.h"
@@ -13,64 +12,6 @@
 
 namespace qzivi {
 namespace {
-
-// A panel that keeps a fixed size of its own, as the real panels keep their design size.
-class FakePanel : public IQZIviFgenPanel {
-public:
-    explicit FakePanel(std::string className) : className(std::move(className)) {}
-    void Construct(CIviFgenIOImp* io, std::shared_ptr<CIviFgenPropImp>,
-                   std::shared_ptr<CIviErrorReport>) override {
-        constructed = io != nullptr;
-    }
-    void Enabled(bool value) override { enabled = value; }
-    void Size(float, float) override { ++sized; }
-    float Width() const override { return 300; }
-    float Height() const override { return 200; }
-    std::int32_t UiState() const override { return state; }
-    void UiState(std::int32_t value) override { state = value; }
-    void Visible(bool value) override { visible = value; }
-
-    std::string className;
-    bool constructed = false, enabled = false, visible = false;
-    std::int32_t state = 0;
-    int sized = 0;
-};
-
-class PanelHost : public IQZIviFgenHost {
-public:
-    bool UserMode() const override { return userMode; }
-    std::string DisplayName() const override { return "Fgen1"; }
-    float Width() const override { return width; }
-    float Height() const override { return height; }
-    void SetSize(float w, float h) override {
-        width = w;
-        height = h;
-        ++resizes;
-        if (control) control->Resized(); // a host tells the control of every size change
-    }
-    std::shared_ptr<IQZIviFgenPanel> AddChild(const std::string& className,
-                                              const std::string& key) override {
-        EXPECT_EQ(key, "UI");
-        panel = std::make_shared<FakePanel>(className);
-        return panel;
-    }
-    void RemoveChild(const std::string& key) override {
-        EXPECT_EQ(key, "UI");
-        panel.reset();
-    }
-    bool FormEntryVisible() const override { return formVisible; }
-    void SetFormEntryVisible(bool value) override { formVisible = value; }
-    void PropertyChanged(const std::string&) override {}
-    void SendTab() override { ++tabs; }
-    void ShowAboutBox() override {}
-
-    bool userMode = true;
-    float width = 800, height = 600;
-    bool formVisible = true;
-    int resizes = 0, tabs = 0;
-    std::shared_ptr<FakePanel> panel;
-    QZIviFgen* control = nullptr;
-};
 
 class HostingTest : public ::testing::Test {
 protected:

@@ -1,6 +1,7 @@
 // The control on a Qt form: its properties from the root's table, the tree kept in one property
 // so that a form saved and loaded again gives the same tree, the panel of design time, the events
 // as signals, and the start-up configure on Qt's event loop.
+#include "qzivi/control/PageLink.h"
 #include "qzivi/panels/XUILess.h"
 #include "qzivi/qt/QZIviFgenWidget.h"
 
@@ -60,6 +61,20 @@ private slots:
         QCOMPARE(errors.count(), 2);
         QCOMPARE(errors.at(1).at(0).toInt(), -31609);
         QCOMPARE(widget.PropertyBagContents(), before);
+    }
+
+    void anApplyFromThePagesRepublishesEveryProperty() {
+        QZIviFgenWidget widget;
+        CPPObjWrapper page;
+        page.SelectionChanged(widget.Control());
+        page.Props()->ArbSampleRate(2e6);
+        page.Props()->AutoConfigure(true);
+        QCOMPARE(widget.property("ArbSampleRate").toDouble(), widget.Control().ArbSampleRate());
+        QSignalSpy changed(&widget, qOverload<const QString&>(&QZIviFgenWidget::PropertyChanged));
+        page.ApplyChanges(true);
+        QCOMPARE(widget.property("ArbSampleRate").toDouble(), 2e6);
+        QCOMPARE(widget.property("AutoConfigure").toBool(), true);
+        QCOMPARE(changed.last().at(0).toString(), QString());
     }
 
     void atDesignTimeStyleZeroShowsTheIconAndAtRunTimeNothing() {

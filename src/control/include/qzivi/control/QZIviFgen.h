@@ -3,6 +3,7 @@
 // reaches the caller as a Failure only when ExceptionOnError is true.
 #pragma once
 
+#include "qzivi/control/PageLink.h"
 #include "qzivi/driver/CIviErrorReport.h"
 #include "qzivi/engine/CIviFgenIOImp.h"
 #include "qzivi/model/CIviFgenPropImp.h"
@@ -19,11 +20,11 @@ class IQZIviFgenHost;
 class IQZIviFgenPanel;
 class PropertyBag;
 
-class QZIviFgen {
+class QZIviFgen : public IQZCtlUtil {
 public:
     // `host` may be null: the control then behaves as at run time with no panel.
     explicit QZIviFgen(IQZIviFgenHost* host = nullptr);
-    ~QZIviFgen();
+    ~QZIviFgen() override;
     QZIviFgen(const QZIviFgen&) = delete;
     QZIviFgen& operator=(const QZIviFgen&) = delete;
 
@@ -96,9 +97,20 @@ public:
     // After an apply from the pages changed Enabled: the panel takes the state of the control.
     void RefreshPanel();
 
+    // ---- The property pages' link (IQZCtlUtil); failures raise to the page ----
+    std::shared_ptr<CIviFgenPropImp> PropCopy() override;
+    std::int32_t LastChangeIndex() override;
+    std::int32_t IncrementLastChangeIndex() override;
+    void RegisterSelectionChanged() override;
+    void RegisterApplyChanges() override;
+    void ReleaseCopy(bool force) override;
+
 private:
     template <typename F>
     auto Frame(const char* source, F&& body) -> decltype(body());
+    // A member the pages call: the failure is reported to no one and raised to the page.
+    template <typename F>
+    auto PageFrame(const char* source, F&& body) -> decltype(body());
     void FinishLoad();
     void SetDisplayName(const std::string& name);
     void ConnectPropertySet();
@@ -126,6 +138,10 @@ private:
         std::int32_t savedState = 0;
     } m_oStyle;
     bool m_bResizing = false;
+    // The pages' working copy, present while a page link holds it, and their change counter.
+    std::shared_ptr<CIviFgenPropImp> m_oPropCopy;
+    std::int32_t m_nCopyUsers = 0;
+    std::int32_t m_nLastChangeIndex = 0;
     Connection m_cPropertyChange;
     Connection m_cError;
     Connection m_cWarning;
