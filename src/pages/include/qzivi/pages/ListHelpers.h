@@ -1,0 +1,29 @@
+// The list helpers of every page, over Qt's combo box: filled from a name table, read back by item
+// data, an entry selected by value, and a page's controls drawn anew.
+#pragma once
+
+#include "qzivi/support/variant.h"
+
+class QComboBox;
+class QWidget;
+
+namespace qzivi {
+
+// A table that is no array leaves the list alone. One dimension: each text that isn't "" becomes
+// an entry. Two (row 0 texts, row 1 values): each column with a text becomes an entry whose item
+// data is its value, so the columns of switched-off extensions drop out. Returns true.
+bool FillComboFromTable(QComboBox& list, const Variant& table, bool clear);
+
+// The item data of the selected entry, else `fallback` (missing by default, which the receiver
+// of the value then refuses).
+Variant ComboValue(const QComboBox& list, const Variant& fallback = Variant::Missing());
+
+// Selects the entry of `value` (by item data when `asNumbers`, else by text) or, failing that,
+// the first entry when `firstAsFallback`, or sets an editable list's text. False when it could do
+// neither: a fixed list without entries.
+bool SelectComboEntry(QComboBox& list, const Variant& value, bool asNumbers, bool firstAsFallback);
+
+// Each child control of the page, in order, hidden and shown again as it was.
+void ForceRedrawControls(QWidget& page);
+
+} // namespace qzivi
