@@ -18,14 +18,14 @@ bool InSessionMgrCall = false;
 
 namespace {
 MessageBoxHandler g_messageBox;
+} // namespace
 
-void ShowMessageBox(MessageBoxRequest request) {
+void ShowMessageBox(const MessageBoxRequest& request) {
     if (g_messageBox)
         g_messageBox(request);
     else
         std::fprintf(stderr, "%s: %s\n", request.title.c_str(), request.text.c_str());
 }
-} // namespace
 
 MessageBoxHandler SetMessageBoxHandler(MessageBoxHandler handler) {
     std::swap(g_messageBox, handler);

@@ -1,6 +1,7 @@
 #include "qzivi/pages/CPageHost.h"
 
 #include "qzivi/pages/PropertyPage.h"
+#include "qzivi/panels/MessageBoxes.h"
 
 #include <QDialogButtonBox>
 #include <QPushButton>
@@ -12,6 +13,7 @@ namespace qzivi {
 CPageHost::CPageHost(std::vector<QZIviFgen*> selected, QWidget* parent)
     : QDialog(parent), m_vSelected(std::move(selected)) {
     setWindowTitle(tr("Property Pages"));
+    InstallQtMessageBoxes();
     m_oTabs = new QTabWidget(this);
     m_oButtons = new QDialogButtonBox(
         QDialogButtonBox::Ok | QDialogButtonBox::Cancel | QDialogButtonBox::Apply, this);

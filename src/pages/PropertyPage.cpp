@@ -40,6 +40,8 @@ void PropertyPage::Changed(bool changed) {
 
 void PropertyPage::NoticeCreated() {
     m_oLink = std::make_unique<CPPObjWrapper>();
+    // Filling lists once is no change of the user's either.
+    const LoadingScope loading(m_bLoading);
     Quietly([&] { Created(); });
 }
 

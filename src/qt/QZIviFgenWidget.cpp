@@ -2,6 +2,7 @@
 
 #include "qzivi/control/Panel.h"
 #include "qzivi/model/PropertyBag.h"
+#include "qzivi/panels/MessageBoxes.h"
 #include "qzivi/panels/XUIFgen1.h"
 #include "qzivi/panels/XUIFgen2.h"
 #include "qzivi/panels/XUILess.h"
@@ -68,6 +69,7 @@ void QZIviFgenWidget::RegisterPanel(const std::string& className, PanelMaker mak
 QZIviFgenWidget::QZIviFgenWidget(QWidget* parent, bool userMode)
     : QWidget(parent), m_bUserMode(userMode) {
     QtTickSource::Install();
+    InstallQtMessageBoxes();
     setFocusPolicy(Qt::StrongFocus);
     m_oControl = std::make_unique<QZIviFgen>(static_cast<IQZIviFgenHost*>(this));
     m_cError = m_oControl->IviError.Connect(

@@ -6,8 +6,11 @@
 #include <gmock/gmock.h>
 
 #include <filesystem>
+#include <fstream>
 
 using qzivi::ivi::ConfigStore;
+using qzivi::ivi::EditableConfigStoreFile;
+using qzivi::ivi::FindConfigStoreFile;
 using qzivi::ivi::LoadConfigStore;
 using qzivi::ivi::ParseConfigStore;
 using qzivi::ivi::StatusError;
@@ -135,3 +138,22 @@ TEST(ConfigStoreSearch, AMalformedStoreStopsTheOpenWithItsLine) {
 }
 
 } // namespace
+
+// The configuration tool's file: the store in use, or a new one at the user's place that reads as
+// the embedded default alone and shows it as an example.
+TEST(ConfigStoreFile, TheEditableStoreIsTheOneInUseOrANewCommentedOne) {
+    StoreScope scope;
+    const std::string made = EditableConfigStoreFile();
+    EXPECT_EQ(made, (scope.Dir() / "qzivi" / "qzivi.conf").string());
+    EXPECT_EQ(FindConfigStoreFile(), made) << "found from now on";
+    const ConfigStore store = LoadConfigStore(); // not refused as writable by others
+    ASSERT_EQ(store.sessions.size(), 1u);
+    EXPECT_EQ(store.sessions[0].logicalName, "SampleFGen");
+    std::ifstream file(made);
+    const std::string text((std::istreambuf_iterator<char>(file)), {});
+    EXPECT_THAT(text, ::testing::HasSubstr("# [SampleFGen]\n# module = builtin\n"));
+    EXPECT_THAT(text, ::testing::HasSubstr("# channel Channel2 = 2\n"));
+
+    const std::string named = scope.UseStore("[Bench]\nmodule = builtin\n");
+    EXPECT_EQ(EditableConfigStoreFile(), named);
+}

@@ -5,6 +5,7 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <sys/stat.h>
@@ -122,6 +123,33 @@ std::string FindConfigStoreFile() {
     if (!home.empty() && Exists(home + "/qzivi/qzivi.conf")) return home + "/qzivi/qzivi.conf";
     const std::string system = std::string(QZIVI_SYSCONFDIR) + "/qzivi.conf";
     return Exists(system) ? system : std::string();
+}
+
+std::string EditableConfigStoreFile() {
+    if (std::string found = FindConfigStoreFile(); !found.empty()) return found;
+    std::string home = Env("XDG_CONFIG_HOME");
+    if (home.empty() && !Env("HOME").empty()) home = Env("HOME") + "/.config";
+    if (home.empty())
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE, "no place for a configuration store: "
+                                                      "neither XDG_CONFIG_HOME nor HOME is set");
+    const std::string path = home + "/qzivi/qzivi.conf";
+    std::error_code ignored;
+    std::filesystem::create_directories(home + "/qzivi", ignored);
+    const DriverSession d = EmbeddedSampleFGen();
+    std::ofstream file(path);
+    file << "# The IVI configuration store: one [LogicalName] section a session.\n"
+         << "# \"" << d.logicalName << "\" stands built in, as if written here:\n#\n"
+         << "# [" << d.logicalName << "]\n# module = " << d.module << "\n# prefix = " << d.prefix
+         << "\n# resource = " << d.resource << "\n# options = " << d.options << "\n";
+    for (const auto& [virtualName, physical] : d.virtualNames)
+        file << "# channel " << virtualName << " = " << physical << "\n";
+    if (!file.flush())
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                          "configuration store \"" + path +
+                              "\" cannot be written: " + std::strerror(errno));
+    // The store names code to load: it must not be writable by others, whatever the umask.
+    std::filesystem::permissions(path, std::filesystem::perms(0644), ignored);
+    return path;
 }
 
 ConfigStore LoadConfigStore() {

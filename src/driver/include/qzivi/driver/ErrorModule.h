@@ -29,6 +29,7 @@ struct PendingFailure {
     std::string description;
     std::string helpFile;
     std::int32_t helpContext = 0;
+    bool critical = true; // the error boxes; a plain note has no icon
 };
 // Call only inside a catch handler.
 PendingFailure CurrentFailure();
@@ -53,10 +54,13 @@ struct MessageBoxRequest {
     std::string title;
     std::string helpFile;
     std::int32_t helpContext = 0;
+    bool critical = true; // the error boxes; a plain note has no icon
 };
 using MessageBoxHandler = std::function<void(const MessageBoxRequest&)>;
 // Returns the handler it replaces; MessageBoxScope puts it back at the end of a scope.
 MessageBoxHandler SetMessageBoxHandler(MessageBoxHandler handler);
 using MessageBoxScope = ScopedHook<MessageBoxHandler, &SetMessageBoxHandler>;
+// Shows a box through the handler.
+void ShowMessageBox(const MessageBoxRequest& request);
 
 } // namespace qzivi

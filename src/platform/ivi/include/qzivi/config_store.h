@@ -51,6 +51,11 @@ ConfigStore ParseConfigStore(std::string_view text, const std::string& path);
 // The path the search order gives, or "" if no file exists.
 std::string FindConfigStoreFile();
 
+// The store for a person to edit: the one the search order gives, or else a new one at the user's
+// place ($XDG_CONFIG_HOME/qzivi/qzivi.conf) holding the embedded default as a commented example.
+// Throws StatusError if the new file cannot be written.
+std::string EditableConfigStoreFile();
+
 // Reads the store the search order gives. Throws StatusError for a file that cannot be read, is
 // malformed, or can be written by others.
 ConfigStore LoadConfigStore();
