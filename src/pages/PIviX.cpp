@@ -12,6 +12,7 @@
 #include <QDesktopServices>
 #include <QGridLayout>
 #include <QGroupBox>
+#include <QHBoxLayout>
 #include <QLabel>
 #include <QToolButton>
 #include <QUrl>
@@ -59,16 +60,18 @@ PIviX::PIviX(QWidget* parent) : PropertyPage(tr("QZ IVI"), parent) {
     cmdBMC->setAccessibleName(cmdBMC->toolTip());
     cmdBMC->setIconSize(QSize(24, 24));
 
-    auto* layout = new QGridLayout(this);
-    layout->addWidget(label, 0, 0, 1, 2);
-    layout->addWidget(cmbLogicalName, 1, 0);
-    layout->addWidget(cmdBMC, 1, 1);
+    auto* layout = new QHBoxLayout(this);
+    auto* left = new QGridLayout;
+    layout->addLayout(left, 1);
+    left->addWidget(label, 0, 0, 1, 2);
+    left->addWidget(cmbLogicalName, 1, 0);
+    left->addWidget(cmdBMC, 1, 1);
     for (int i = 0; i < 4; ++i) {
         chkIviX[i] = new QCheckBox(tr(kChecks[i][0]), this);
         chkIviX[i]->setObjectName(QStringLiteral("chkIviX%1").arg(i));
         chkIviX[i]->setToolTip(tr(kChecks[i][1]));
         connect(chkIviX[i], &QCheckBox::clicked, this, [this] { UserChanged(); });
-        layout->addWidget(chkIviX[i], 2 + i, 0, 1, 2);
+        left->addWidget(chkIviX[i], 2 + i, 0, 1, 2);
     }
     auto* frame = new QGroupBox(tr("UI style"), this);
     frame->setObjectName("Frame1");
@@ -84,9 +87,9 @@ PIviX::PIviX(QWidget* parent) : PropertyPage(tr("QZ IVI"), parent) {
     auto* styleLayout = new QVBoxLayout(frame);
     styleLayout->addWidget(cmbUIStyle);
     styleLayout->addWidget(imgUIStyle, 0, Qt::AlignHCenter);
-    layout->addWidget(frame, 0, 2, 6, 1);
-    layout->setRowStretch(6, 1);
-    layout->setColumnStretch(0, 1);
+    left->setRowStretch(6, 1);
+    left->setColumnStretch(0, 1);
+    layout->addWidget(frame, 0, Qt::AlignTop);
 
     connect(cmbLogicalName, &QComboBox::editTextChanged, this, [this] {
         UserChanged();

@@ -1,5 +1,10 @@
 // Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
 // of the folder given: grab_widgets docs/images
+#include "qzivi/pages/CPageHost.h"
+#include "qzivi/pages/PExtensions.h"
+#include "qzivi/pages/PGeneral.h"
+#include "qzivi/pages/PInternal.h"
+#include "qzivi/pages/PIviX.h"
 #include "qzivi/panels/Pictures.h"
 #include "qzivi/panels/XUILess.h"
 #include "qzivi/panels/XWinLabel.h"
@@ -13,6 +18,7 @@
 #include <QHBoxLayout>
 #include <QPainter>
 #include <QPixmap>
+#include <QTabWidget>
 #include <QTimer>
 
 #include <cmath>
@@ -154,6 +160,25 @@ int main(int argc, char** argv) {
         Save(display, folder, name + "error");
         display.resize(display.size() * 2);
         Save(display, folder, name + "error-twice-the-size");
+    }
+
+    // Each property page in the page host.
+    {
+        QZIviFgenWidget form;
+        form.Control().Extensions(0x3FF);
+        form.Control().UIStyle(1);
+        CPageHost host({&form.Control()});
+        for (PropertyPage* page : std::initializer_list<PropertyPage*>{
+                 new PIviX, new PGeneral, new PExtensions, new PInternal})
+            host.AddPage(page);
+        host.show();
+        const char* const names[] = {"page-control", "page-general", "page-extensions",
+                                     "page-internal"};
+        for (int i = 0; i < host.Tabs().count(); ++i) {
+            host.Tabs().setCurrentIndex(i);
+            Save(host, folder, names[i]);
+        }
+        host.reject();
     }
 
     // The About box of a control with a session on the simulator, grabbed while it is open.
