@@ -156,7 +156,7 @@ void PIviX::OpenConfigurationTool() {
         if (!Editor()(QString::fromStdString(path)))
             ShowMessageBox({"Incorrect version of the Benchmate Console.  Please update to the "
                             "latest version for this functionality.",
-                            "", "", 0, false});
+                            "", "", 0, BoxIcon::None});
     } catch (...) {
         HandleError("", 1, nullptr);
     }

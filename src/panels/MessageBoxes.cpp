@@ -10,7 +10,10 @@ namespace qzivi {
 void InstallQtMessageBoxes() {
     static const bool installed = [] {
         SetMessageBoxHandler([](const MessageBoxRequest& request) {
-            QMessageBox box(request.critical ? QMessageBox::Critical : QMessageBox::NoIcon,
+            static constexpr QMessageBox::Icon kIcons[] = {
+                QMessageBox::NoIcon, QMessageBox::Critical, QMessageBox::Warning,
+                QMessageBox::Information};
+            QMessageBox box(kIcons[static_cast<int>(request.icon)],
                             QString::fromStdString(request.title),
                             QString::fromStdString(request.text), QMessageBox::Ok,
                             QApplication::activeWindow());

@@ -118,7 +118,7 @@ private slots:
         QCOMPARE(boxes[0].text, std::string("Incorrect version of the Benchmate Console.  Please "
                                             "update to the latest version for this "
                                             "functionality."));
-        QVERIFY(!boxes[0].critical);
+        QVERIFY(boxes[0].icon == BoxIcon::None);
     }
 
     void theGeneralPageDropsAModeWhoseExtensionWasTakenAway() {

@@ -29,7 +29,6 @@ struct PendingFailure {
     std::string description;
     std::string helpFile;
     std::int32_t helpContext = 0;
-    bool critical = true; // the error boxes; a plain note has no icon
 };
 // Call only inside a catch handler.
 PendingFailure CurrentFailure();
@@ -47,6 +46,8 @@ void HandleError(std::string source, std::int32_t mode, CIviErrorReport* reporte
 
 std::string FirstLine(std::string_view text);
 
+enum class BoxIcon { None, Critical, Exclamation, Information };
+
 // The message box of mode 1. Without a handler the text goes to standard error; the Qt layer
 // puts a real box here.
 struct MessageBoxRequest {
@@ -54,7 +55,7 @@ struct MessageBoxRequest {
     std::string title;
     std::string helpFile;
     std::int32_t helpContext = 0;
-    bool critical = true; // the error boxes; a plain note has no icon
+    BoxIcon icon = BoxIcon::Critical; // the error boxes' icon
 };
 using MessageBoxHandler = std::function<void(const MessageBoxRequest&)>;
 // Returns the handler it replaces; MessageBoxScope puts it back at the end of a scope.

@@ -1,0 +1,258 @@
+#include "qzivi/pages/PIviConfigurations.h"
+
+#include "qzivi/control/QZIviFgen.h"
+#include "qzivi/driver/ErrorModule.h"
+#include "qzivi/model/QZIviConfigurations.h"
+#include "qzivi/panels/CCommonDialog.h"
+#include "qzivi/panels/Pictures.h"
+
+#include <QGridLayout>
+#include <QGroupBox>
+#include <QHBoxLayout>
+#include <QLabel>
+#include <QLineEdit>
+#include <QListWidget>
+#include <QPushButton>
+#include <QToolButton>
+#include <QVBoxLayout>
+
+#include <algorithm>
+
+namespace qzivi {
+
+namespace {
+
+const char* const kFilter = "QZ IVI Configurations (*.qzc)|*.qzc";
+
+template <typename T>
+T* Made(T* control, const char* name, const QString& tip) {
+    control->setObjectName(name);
+    control->setToolTip(tip);
+    if (control->accessibleName().isEmpty()) control->setAccessibleName(tip);
+    return control;
+}
+
+} // namespace
+
+PIviConfigurations::PIviConfigurations(QWidget* parent)
+    : PropertyPage(tr("Configurations"), parent) {
+    const QString verifyTip =
+        tr("Ensures that the current property set is valid for the instrument.");
+    cmdVerifyConfig = Made(new QToolButton(this), "cmdVerifyConfig", verifyTip);
+    cmdVerifyConfig->setIcon(LoadPictureFromResource(120));
+    cmdVerifyConfig->setIconSize(QSize(24, 24));
+    auto* frame = new QGroupBox(tr("Configuration sets"), this);
+    frame->setObjectName("Frame1");
+    cmdStore = Made(new QPushButton(tr("Store"), frame), "cmdStore",
+                    tr("Stores the current property set into the selected configuration."));
+    txtRename = Made(new QLineEdit(frame), "txtRename", tr("Rename the configuration."));
+    cmdExport = Made(new QToolButton(frame), "cmdExport",
+                     tr("Exports the selected configuration to a file."));
+    cmdExport->setIcon(LoadPictureFromResource(117));
+    cmdImport = Made(new QToolButton(frame), "cmdImport",
+                     tr("Imports a configuration from a file into the selected configuration."));
+    cmdImport->setIcon(LoadPictureFromResource(118));
+    cmdDefaults = Made(new QPushButton(tr("Set to default"), frame), "cmdDefaults",
+                       tr("Sets all properties to their default values."));
+    cmdDel = Made(new QPushButton(tr("Remove"), frame), "cmdDel", tr("Removes a configuration."));
+    cmdLoad = Made(new QPushButton(tr("Load"), frame), "cmdLoad",
+                   tr("Loads the selected configuration into the current property set."));
+    cmdAdd = Made(new QPushButton(tr("Add"), frame), "cmdAdd", tr("Adds a configuration."));
+    lstConfigs = Made(new QListWidget(frame), "lstConfigs", tr("Selects a configuration."));
+    auto* label = Made(new QLabel(tr("Verify current configuration"), this), "Label1", verifyTip);
+    label->setBuddy(cmdVerifyConfig);
+
+    auto* buttons = new QVBoxLayout;
+    for (QWidget* b : {static_cast<QWidget*>(cmdAdd), static_cast<QWidget*>(cmdDel),
+                       static_cast<QWidget*>(cmdLoad), static_cast<QWidget*>(cmdStore),
+                       static_cast<QWidget*>(cmdDefaults)})
+        buttons->addWidget(b);
+    auto* files = new QHBoxLayout;
+    files->addWidget(cmdImport);
+    files->addWidget(cmdExport);
+    files->addStretch(1);
+    buttons->addLayout(files);
+    buttons->addStretch(1);
+    auto* inner = new QHBoxLayout(frame);
+    inner->addWidget(lstConfigs, 1);
+    inner->addLayout(buttons);
+    auto* verify = new QHBoxLayout;
+    verify->addWidget(cmdVerifyConfig);
+    verify->addWidget(label, 1);
+    auto* layout = new QVBoxLayout(this);
+    layout->addWidget(frame, 1);
+    layout->addLayout(verify);
+    setTabOrder(cmdVerifyConfig, cmdStore);
+
+    m_oLUI.Attach(lstConfigs, cmdAdd, cmdDel, txtRename);
+    m_oLUI.BaseName("NewConfig");
+    m_vEvents.push_back(m_oLUI.BeforeAdd.Connect([this](std::string&) {
+        if (m_bUpdating) return;
+        if (lstConfigs->count() > 0 && txtRename->isVisible()) txtRename->clearFocus();
+    }));
+    m_vEvents.push_back(m_oLUI.ItemAdded.Connect([this](std::int32_t index) {
+        if (m_bUpdating) return;
+        Handler([&] {
+            Changed(true);
+            Props().Configurations()->Add(lstConfigs->item(index)->text().toStdString());
+            UpdateButtons(true);
+        });
+    }));
+    m_vEvents.push_back(m_oLUI.BeforeRemove.Connect([this](std::int32_t) {
+        if (!m_bUpdating) m_bRemoving = true;
+    }));
+    m_vEvents.push_back(m_oLUI.ItemRemoved.Connect([this](std::int32_t index) {
+        if (m_bUpdating) return;
+        Handler([&] {
+            Changed(true);
+            Props().Configurations()->Remove(index + 1);
+            UpdateButtons(true);
+            Link().AlertChanges();
+        });
+        m_bRemoving = false;
+    }));
+    m_vEvents.push_back(m_oLUI.ListItemSelected.Connect([this](std::int32_t& index) {
+        if (!m_bUpdating) m_lSelected = index;
+    }));
+    m_vEvents.push_back(
+        m_oLUI.Validate.Connect([this](std::int32_t& index, std::string& text, bool& cancel) {
+            if (!m_bUpdating) Validate(index, text, cancel);
+        }));
+
+    connect(cmdLoad, &QPushButton::clicked, this, [this] {
+        Handler([&] {
+            Selected()->Load();
+            Link().ApplyChanges(true);
+        });
+    });
+    connect(cmdStore, &QPushButton::clicked, this, [this] {
+        Handler([&] {
+            Selected()->Store();
+            Changed(true);
+        });
+    });
+    connect(cmdDefaults, &QPushButton::clicked, this, [this] {
+        Handler([&] {
+            Props().InitProperties();
+            Link().AlertChanges();
+            Changed(true);
+        });
+    });
+    connect(cmdExport, &QToolButton::clicked, this, [this] {
+        Handler([&] {
+            CCommonDialog dialog;
+            dialog.DialogTitle = tr("Export QZ IVI Configuration as ...");
+            dialog.Filter = kFilter;
+            dialog.DefaultExt = "qzc";
+            dialog.Flags = CCommonDialog::cdlOFNOverwritePrompt;
+            if (dialog.ShowSave(this)) Selected()->Export(dialog.FileName.toStdString());
+        });
+    });
+    connect(cmdImport, &QToolButton::clicked, this, [this] {
+        Handler([&] {
+            CCommonDialog dialog;
+            dialog.DialogTitle = tr("Import QZ IVI Configuration...");
+            dialog.Filter = kFilter;
+            dialog.DefaultExt = "qzc";
+            dialog.Flags = CCommonDialog::cdlOFNFileMustExist;
+            const bool chosen = dialog.ShowOpen(this);
+            Changed(true);
+            if (chosen) Selected()->Import(dialog.FileName.toStdString());
+        });
+    });
+    connect(cmdVerifyConfig, &QToolButton::clicked, this, [this] { Handler([&] { Verify(); }); });
+}
+
+template <typename F>
+void PIviConfigurations::Handler(F&& action) {
+    try {
+        action();
+    } catch (...) {
+        HandleError("", 1, nullptr);
+    }
+}
+
+void PIviConfigurations::Load() {
+    const bool was = m_bUpdating;
+    m_bUpdating = true;
+    try {
+        lstConfigs->clear();
+        for (const auto& configuration : *Props().Configurations())
+            m_oLUI.Add(configuration->Name());
+        if (lstConfigs->count() > 0) lstConfigs->setCurrentRow(0);
+        m_lSelected = lstConfigs->currentRow();
+        UpdateButtons(true);
+    } catch (...) {
+        m_bUpdating = was;
+        throw;
+    }
+    m_bUpdating = was;
+}
+
+void PIviConfigurations::Apply() {
+    // A rename still open ends as the host's validation of the controls would end it.
+    m_bRenameEnded = false;
+    if (txtRename->isVisible()) lstConfigs->setFocus();
+    if (!m_bRenameEnded) Link().ApplyChanges(false);
+    m_bRenameEnded = false;
+}
+
+QWidget* PIviConfigurations::FirstControl() {
+    return lstConfigs->count() > 0 ? static_cast<QWidget*>(lstConfigs) : cmdAdd;
+}
+
+void PIviConfigurations::UpdateButtons(bool on) {
+    const bool some = on && lstConfigs->count() > 0;
+    for (QWidget* b : {static_cast<QWidget*>(cmdLoad), static_cast<QWidget*>(cmdStore),
+                       static_cast<QWidget*>(cmdImport), static_cast<QWidget*>(cmdExport),
+                       static_cast<QWidget*>(cmdDel)})
+        b->setEnabled(some);
+}
+
+std::shared_ptr<QZIviConfiguration> PIviConfigurations::Selected() {
+    QListWidgetItem* item = lstConfigs->currentItem();
+    return Props().Configurations()->Item(item ? item->text().toStdString() : std::string());
+}
+
+void PIviConfigurations::Validate(std::int32_t index, std::string& text, bool& cancel) {
+    Handler([&] {
+        auto& configurations = *Props().Configurations();
+        const bool blank = text.find_first_not_of(' ') == std::string::npos;
+        const bool taken =
+            std::any_of(configurations.begin(), configurations.end(),
+                        [&](const auto& configuration) { return configuration->Name() == text; });
+        if (!cancel && !blank && !taken) {
+            configurations.Item(index + 1)->SetName(text);
+            Link().AlertChanges();
+        } else {
+            cancel = true;
+        }
+    });
+    Changed(true);
+    m_bRenameEnded = true;
+}
+
+// Tries the settings on the instrument through the control itself, and leaves no session open.
+void PIviConfigurations::Verify() {
+    QZIviFgen& control = *SelectedControls().at(0);
+    std::string failure;
+    const auto heard = control.IviError.Connect(
+        [&](std::int32_t, const std::string&, const std::string& description) {
+            if (failure.empty()) failure = description;
+        });
+    try {
+        control.Init();
+        if (failure.empty()) control.Configure();
+    } catch (const std::exception& e) {
+        if (failure.empty()) failure = e.what();
+    }
+    if (failure.empty())
+        ShowMessageBox({"Configuration Verified!", "", "", 0, BoxIcon::Information});
+    else
+        ShowMessageBox(
+            {"Verification Failed!\r\nPlease investigate the following problem:\r\n\r\n" + failure,
+             "", "", 0, BoxIcon::Exclamation});
+    if (control.SessionHandle() != 0) control.CloseSession();
+}
+
+} // namespace qzivi
