@@ -15,6 +15,7 @@ CPageHost::CPageHost(std::vector<QZIviFgen*> selected, QWidget* parent)
     setWindowTitle(tr("Property Pages"));
     InstallQtMessageBoxes();
     m_oTabs = new QTabWidget(this);
+    m_oTabs->setUsesScrollButtons(false); // every page caption in view
     m_oButtons = new QDialogButtonBox(
         QDialogButtonBox::Ok | QDialogButtonBox::Cancel | QDialogButtonBox::Apply, this);
     auto* layout = new QVBoxLayout(this);

@@ -1,9 +1,11 @@
 // Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
 // of the folder given: grab_widgets docs/images
+#include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/pages/CPageHost.h"
 #include "qzivi/pages/PExtensions.h"
 #include "qzivi/pages/PGeneral.h"
 #include "qzivi/pages/PInternal.h"
+#include "qzivi/pages/PIviConfigurations.h"
 #include "qzivi/pages/PIviX.h"
 #include "qzivi/panels/Pictures.h"
 #include "qzivi/panels/XUILess.h"
@@ -167,13 +169,15 @@ int main(int argc, char** argv) {
         QZIviFgenWidget form;
         form.Control().Extensions(0x3FF);
         form.Control().UIStyle(1);
+        form.Control().Configurations()->Add("Bench");
+        form.Control().Configurations()->Add("Sweep 1 kHz to 1 MHz");
         CPageHost host({&form.Control()});
         for (PropertyPage* page : std::initializer_list<PropertyPage*>{
-                 new PIviX, new PGeneral, new PExtensions, new PInternal})
+                 new PIviX, new PGeneral, new PExtensions, new PInternal, new PIviConfigurations})
             host.AddPage(page);
         host.show();
         const char* const names[] = {"page-control", "page-general", "page-extensions",
-                                     "page-internal"};
+                                     "page-internal", "page-configurations"};
         for (int i = 0; i < host.Tabs().count(); ++i) {
             host.Tabs().setCurrentIndex(i);
             Save(host, folder, names[i]);
