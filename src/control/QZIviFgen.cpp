@@ -117,15 +117,6 @@ void QZIviFgen::FinishLoad() {
 // ---- Panel hosting -----------------------------------------------------------------------------
 
 namespace {
-// A step whose failures are ignored, as the host's notices and the panel swap require.
-template <typename F>
-void Quietly(F&& step) {
-    try {
-        step();
-    } catch (...) {
-    }
-}
-
 std::int32_t Whole(float value) {
     return static_cast<std::int32_t>(value);
 }

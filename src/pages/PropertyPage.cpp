@@ -8,14 +8,6 @@ namespace qzivi {
 
 namespace {
 
-template <typename F>
-void Quietly(F&& step) {
-    try {
-        step();
-    } catch (...) {
-    }
-}
-
 // The loading flag for the length of a load, cleared on every way out.
 struct LoadingScope {
     explicit LoadingScope(bool& flag) : flag(flag) { flag = true; }

@@ -1,5 +1,5 @@
-// What the panels' event handlers share: design twips to pixels, steps whose failure is ignored,
-// and the failure of an object that is not set.
+// What the panels' event handlers share: design twips to pixels and the failure of an object that
+// is not set.
 #pragma once
 
 #include "qzivi/panels/CUiSizingTool.h"
@@ -12,15 +12,6 @@ namespace qzivi::panel {
 
 inline int Px(int twips) {
     return static_cast<int>(std::lround(TwipsToPixels(twips)));
-}
-
-// A step of an event handler whose failure leaves what it shows as it was.
-template <typename F>
-void Quietly(F&& step) {
-    try {
-        step();
-    } catch (...) {
-    }
 }
 
 // An object the panel goes through: none is the failure of an unset object (91), which the

@@ -49,4 +49,14 @@ inline constexpr std::int32_t kTooFewData = 60042;
     throw Failure(number, std::move(source), std::move(description));
 }
 
+// Runs a step whose failure is ignored, as the host's notices and the user interface's event
+// handlers require: what the step would have shown stays as it was.
+template <typename F>
+void Quietly(F&& step) noexcept {
+    try {
+        step();
+    } catch (...) {
+    }
+}
+
 } // namespace qzivi
