@@ -22,7 +22,15 @@ namespace qzivi {
 
 namespace {
 
-const char* const kFilter = "QZ IVI Configurations (*.qzc)|*.qzc";
+// The dialogs of export and import: a configuration file, with its extension added.
+CCommonDialog FileDialog(const QString& title, int flags) {
+    CCommonDialog dialog;
+    dialog.DialogTitle = title;
+    dialog.Filter = "QZ IVI Configurations (*.qzc)|*.qzc";
+    dialog.DefaultExt = "qzc";
+    dialog.Flags = flags;
+    return dialog;
+}
 
 template <typename T>
 T* Made(T* control, const char* name, const QString& tip) {
@@ -140,21 +148,15 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
     });
     connect(cmdExport, &QToolButton::clicked, this, [this] {
         Handler([&] {
-            CCommonDialog dialog;
-            dialog.DialogTitle = tr("Export QZ IVI Configuration as ...");
-            dialog.Filter = kFilter;
-            dialog.DefaultExt = "qzc";
-            dialog.Flags = CCommonDialog::cdlOFNOverwritePrompt;
+            CCommonDialog dialog = FileDialog(tr("Export QZ IVI Configuration as ..."),
+                                              CCommonDialog::cdlOFNOverwritePrompt);
             if (dialog.ShowSave(this)) Selected()->Export(dialog.FileName.toStdString());
         });
     });
     connect(cmdImport, &QToolButton::clicked, this, [this] {
         Handler([&] {
-            CCommonDialog dialog;
-            dialog.DialogTitle = tr("Import QZ IVI Configuration...");
-            dialog.Filter = kFilter;
-            dialog.DefaultExt = "qzc";
-            dialog.Flags = CCommonDialog::cdlOFNFileMustExist;
+            CCommonDialog dialog = FileDialog(tr("Import QZ IVI Configuration..."),
+                                              CCommonDialog::cdlOFNFileMustExist);
             const bool chosen = dialog.ShowOpen(this);
             Changed(true);
             if (chosen) Selected()->Import(dialog.FileName.toStdString());
