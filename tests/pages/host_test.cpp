@@ -1,16 +1,21 @@
 // The page host and the page cycle, with pages that record what they are told, and the list
 // helpers on real lists.
 #include "qzivi/control/QZIviFgen.h"
+#include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/PropertyBag.h"
 #include "qzivi/pages/CPageHost.h"
 #include "qzivi/pages/ListHelpers.h"
 #include "qzivi/pages/PropertyPage.h"
+#include "qzivi/support/failure.h"
 
+#include <QApplication>
 #include <QComboBox>
 #include <QLineEdit>
+#include <QMessageBox>
 #include <QPushButton>
 #include <QTabWidget>
 #include <QTest>
+#include <QTimer>
 
 #include <cstdlib>
 
@@ -126,6 +131,30 @@ private slots:
         QTest::keyClick(&host, Qt::Key_Return);
         QCOMPARE(control.ArbSampleRate(), 5e5);
         QCOMPARE(host.result(), int(QDialog::Accepted));
+    }
+
+    void aFailureInAPageShowsACriticalBoxWithTheTextsAsGiven() {
+        QZIviFgen control;
+        CPageHost host({&control}); // puts the Qt boxes in
+        host.show();
+        QString title, text;
+        QMessageBox::Icon icon = QMessageBox::NoIcon;
+        QTimer::singleShot(0, [&] {
+            auto* box = qobject_cast<QMessageBox*>(QApplication::activeModalWidget());
+            QVERIFY(box != nullptr);
+            title = box->windowTitle();
+            text = box->text();
+            icon = box->icon();
+            box->accept();
+        });
+        try {
+            RaiseRuntime(-31601, "Waveform \"Ramp\" has no data.", "Waveforms.Item");
+        } catch (...) {
+            HandleError("Apply", 1, nullptr);
+        }
+        QCOMPARE(icon, QMessageBox::Critical);
+        QCOMPARE(title, QStringLiteral("Apply"));
+        QVERIFY2(text.endsWith("Waveform \"Ramp\" has no data."), qPrintable(text));
     }
 
     void aTableFillsAListWithTheColumnsThatHaveATextAndTheirValues() {
