@@ -96,7 +96,7 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
     m_oLUI.BaseName("NewConfig");
     m_vEvents.push_back(m_oLUI.BeforeAdd.Connect([this](std::string&) {
         if (m_bUpdating) return;
-        if (lstConfigs->count() > 0 && txtRename->isVisible()) txtRename->clearFocus();
+        if (lstConfigs->count() > 0) m_oLUI.CommitRename();
     }));
     m_vEvents.push_back(m_oLUI.ItemAdded.Connect([this](std::int32_t index) {
         if (m_bUpdating) return;
@@ -106,9 +106,6 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
             UpdateButtons(true);
         });
     }));
-    m_vEvents.push_back(m_oLUI.BeforeRemove.Connect([this](std::int32_t) {
-        if (!m_bUpdating) m_bRemoving = true;
-    }));
     m_vEvents.push_back(m_oLUI.ItemRemoved.Connect([this](std::int32_t index) {
         if (m_bUpdating) return;
         Handler([&] {
@@ -117,7 +114,6 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
             UpdateButtons(true);
             Link().AlertChanges();
         });
-        m_bRemoving = false;
     }));
     m_vEvents.push_back(m_oLUI.ListItemSelected.Connect([this](std::int32_t& index) {
         if (!m_bUpdating) m_lSelected = index;
@@ -191,12 +187,10 @@ void PIviConfigurations::Load() {
     m_bUpdating = was;
 }
 
+// A rename still open ends first, and the apply then takes it along: OK must not lose it.
 void PIviConfigurations::Apply() {
-    // A rename still open ends as the host's validation of the controls would end it.
-    m_bRenameEnded = false;
-    if (txtRename->isVisible()) lstConfigs->setFocus();
-    if (!m_bRenameEnded) Link().ApplyChanges(false);
-    m_bRenameEnded = false;
+    m_oLUI.CommitRename();
+    Link().ApplyChanges(false);
 }
 
 QWidget* PIviConfigurations::FirstControl() {
@@ -231,7 +225,6 @@ void PIviConfigurations::Validate(std::int32_t index, std::string& text, bool& c
         }
     });
     Changed(true);
-    m_bRenameEnded = true;
 }
 
 // Tries the settings on the instrument through the control itself, and leaves no session open.

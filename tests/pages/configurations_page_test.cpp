@@ -104,10 +104,18 @@ private slots:
         QCOMPARE(Copy().Item(2)->Name(), std::string("NewConfig2"));
         QCOMPARE(control_->LastChangeIndex(), counter);
 
+        // An apply ends a rename still open, and keeps it.
+        page_->lstConfigs->setCurrentRow(1);
+        QTest::keyClick(page_->lstConfigs, Qt::Key_F2);
+        QTest::keyClicks(page_->txtRename, "Sweep");
+        host_->Apply();
+        QCOMPARE(control_->Configurations()->Item(2)->Name(), std::string("Sweep"));
+        QVERIFY(page_->txtRename->isHidden());
+
         page_->lstConfigs->setCurrentRow(0);
         page_->cmdDel->click();
         QCOMPARE(Copy().Count(), 1);
-        QCOMPARE(Copy().Item(1)->Name(), std::string("NewConfig2"));
+        QCOMPARE(Copy().Item(1)->Name(), std::string("Sweep"));
         page_->cmdDel->click();
         QCOMPARE(Copy().Count(), 0);
         QVERIFY(!page_->cmdLoad->isEnabled() && !page_->cmdDel->isEnabled());

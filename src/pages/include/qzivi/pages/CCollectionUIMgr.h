@@ -42,6 +42,8 @@ public:
     // Silent: neither BeforeRemove nor ItemRemoved; -1 is the current entry.
     void Remove(std::int32_t index);
     void SetItemText(const std::string& text, std::int32_t index);
+    // Ends a rename in progress as leaving the edit box does: validated, and kept unless refused.
+    void CommitRename() { EndRename(false); }
 
     Event<std::int32_t&> ListItemSelected;
     Event<std::string&> BeforeAdd;

@@ -47,8 +47,6 @@ private:
     CCollectionUIMgr m_oLUI;
     std::vector<Connection> m_vEvents;
     bool m_bUpdating = false;
-    bool m_bRemoving = false;
-    bool m_bRenameEnded = false;
     std::int32_t m_lSelected = -1;
 };
 
