@@ -13,6 +13,7 @@
 #include <QIcon>
 #include <QWidget>
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -70,8 +71,7 @@ private:
     void OnCollectionChanged();
 
     // ---- The operator's actions; a failure goes to HandleError and the action ends ----
-    template <typename F>
-    void Act(F&& action);
+    void Act(const std::function<void()>& action);
     void FunctionClick(int index);
     void KnobPressed();
     void KnobReleased();
