@@ -1,5 +1,14 @@
 #include "qzivi/pages/CPageHost.h"
 
+#include "qzivi/pages/PArb.h"
+#include "qzivi/pages/PChannels.h"
+#include "qzivi/pages/PExtensions.h"
+#include "qzivi/pages/PGeneral.h"
+#include "qzivi/pages/PInternal.h"
+#include "qzivi/pages/PIviConfigurations.h"
+#include "qzivi/pages/PIviX.h"
+#include "qzivi/pages/PSequence.h"
+
 #include "qzivi/pages/PropertyPage.h"
 #include "qzivi/panels/MessageBoxes.h"
 
@@ -52,6 +61,13 @@ void CPageHost::AddPage(PropertyPage* page) {
     connect(page, &PropertyPage::ChangedChanged, this, [this] { ShowApply(); });
     page->NoticeCreated();
     page->NoticeSelectionChanged(m_vSelected);
+}
+
+void CPageHost::AddStandardPages() {
+    for (PropertyPage* page : std::initializer_list<PropertyPage*>{
+             new PIviX, new PGeneral, new PExtensions, new PChannels, new PArb, new PSequence,
+             new PInternal, new PIviConfigurations})
+        AddPage(page);
 }
 
 void CPageHost::Apply() {

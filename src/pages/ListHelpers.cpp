@@ -47,6 +47,19 @@ bool SelectComboEntry(QComboBox& list, const Variant& value, bool asNumbers, boo
     return true;
 }
 
+std::int32_t ComboNumber(const QComboBox& list) {
+    return ComboValue(list, ParseLeadingNumber(list.currentText().toStdString())).AsInt32();
+}
+
+void ClearCombo(QComboBox& list) {
+    list.setCurrentIndex(-1);
+    if (list.isEditable()) list.setEditText(QString());
+}
+
+bool RenameRefused(const std::string& text, std::int32_t indexOfName) {
+    return text.find_first_not_of(' ') == std::string::npos || indexOfName != -1;
+}
+
 void ForceRedrawControls(QWidget& page) {
     for (QWidget* control : page.findChildren<QWidget*>(Qt::FindDirectChildrenOnly)) {
         const bool visible = !control->isHidden();

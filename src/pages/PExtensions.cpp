@@ -1,6 +1,5 @@
 #include "qzivi/pages/PExtensions.h"
 
-#include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/QZIviFgenTypes.h"
 
 #include <QCheckBox>
@@ -84,13 +83,11 @@ PExtensions::PExtensions(QWidget* parent) : PropertyPage(tr("Extensions"), paren
 }
 
 void PExtensions::Clicked() {
-    try {
+    Handled([&] {
         UserChanged();
         EnableTriggerOptions(chkExtension[5]->isChecked());
         EnableArbSequence(chkExtension[2]->isChecked());
-    } catch (...) {
-        HandleError("", 1, nullptr);
-    }
+    });
 }
 
 void PExtensions::Load() {

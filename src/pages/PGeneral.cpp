@@ -1,6 +1,5 @@
 #include "qzivi/pages/PGeneral.h"
 
-#include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/QZIviFgenEnum.h"
 #include "qzivi/pages/ListHelpers.h"
 #include "qzivi/panels/MUiAndStringUtil.h"
@@ -26,13 +25,7 @@ PGeneral::PGeneral(QWidget* parent) : PropertyPage(tr("General"), parent) {
         layout->addRow(label, field);
     };
     // A failure of a change handler shows in a box.
-    const auto guarded = [this] {
-        try {
-            UserChanged();
-        } catch (...) {
-            HandleError("", 1, nullptr);
-        }
-    };
+    const auto guarded = [this] { Handled([&] { UserChanged(); }); };
     for (int i = 0; i < 2; ++i) {
         cmbGeneral[i] = new QComboBox(this);
         cmbGeneral[i]->setObjectName(QStringLiteral("cmbGeneral%1").arg(i));

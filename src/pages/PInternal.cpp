@@ -1,11 +1,9 @@
 #include "qzivi/pages/PInternal.h"
 
-#include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/QZIviFgenEnum.h"
 #include "qzivi/model/QZIviFgenInternalConfig.h"
 #include "qzivi/model/QZIviFgenTypes.h"
 #include "qzivi/pages/ListHelpers.h"
-#include "qzivi/panels/MUiAndStringUtil.h"
 #include "qzivi/support/text.h"
 
 #include <QComboBox>
@@ -52,10 +50,6 @@ double Strict(const QLineEdit& field) {
     return Variant(field.text().toStdString()).AsDouble();
 }
 
-std::int32_t ListValue(const QComboBox& list) {
-    return ComboValue(list, ParseLeadingNumber(list.currentText().toStdString())).AsInt32();
-}
-
 } // namespace
 
 PInternal::PInternal(QWidget* parent) : PropertyPage(tr("Internal"), parent) {
@@ -97,11 +91,7 @@ PInternal::PInternal(QWidget* parent) : PropertyPage(tr("Internal"), parent) {
 }
 
 void PInternal::FieldChanged() {
-    try {
-        UserChanged();
-    } catch (...) {
-        HandleError("", 1, nullptr);
-    }
+    Handled([&] { UserChanged(); });
 }
 
 void PInternal::Load() {
@@ -137,10 +127,10 @@ void PInternal::Save() {
     const auto listOpen = [&](const QComboBox* list) { return open(list) && list->count() > 0; };
     if (open(txtInternal[0])) internal.InternalTriggerRate(Strict(*txtInternal[0]));
     if (open(txtInternal[1])) internal.AMInternalDepth(Strict(*txtInternal[1]));
-    if (listOpen(cmbWaveform[2])) internal.AMInternalWaveform(ListValue(*cmbWaveform[2]));
+    if (listOpen(cmbWaveform[2])) internal.AMInternalWaveform(ComboNumber(*cmbWaveform[2]));
     if (open(txtInternal[3])) internal.AMInternalFrequency(Strict(*txtInternal[3]));
     if (open(txtInternal[4])) internal.FMInternalDeviation(Strict(*txtInternal[4]));
-    if (listOpen(cmbWaveform[5])) internal.FMInternalWaveform(ListValue(*cmbWaveform[5]));
+    if (listOpen(cmbWaveform[5])) internal.FMInternalWaveform(ComboNumber(*cmbWaveform[5]));
     if (open(txtInternal[6])) internal.FMInternalFrequency(Strict(*txtInternal[6]));
 }
 

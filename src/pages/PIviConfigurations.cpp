@@ -3,6 +3,7 @@
 #include "qzivi/control/QZIviFgen.h"
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/model/QZIviConfigurations.h"
+#include "qzivi/pages/ListHelpers.h"
 #include "qzivi/panels/CCommonDialog.h"
 #include "qzivi/panels/Pictures.h"
 
@@ -100,7 +101,7 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
     }));
     m_vEvents.push_back(m_oLUI.ItemAdded.Connect([this](std::int32_t index) {
         if (m_bUpdating) return;
-        Handler([&] {
+        Handled([&] {
             Changed(true);
             Props().Configurations()->Add(lstConfigs->item(index)->text().toStdString());
             UpdateButtons(true);
@@ -108,7 +109,7 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
     }));
     m_vEvents.push_back(m_oLUI.ItemRemoved.Connect([this](std::int32_t index) {
         if (m_bUpdating) return;
-        Handler([&] {
+        Handled([&] {
             Changed(true);
             Props().Configurations()->Remove(index + 1);
             UpdateButtons(true);
@@ -124,33 +125,33 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
         }));
 
     connect(cmdLoad, &QPushButton::clicked, this, [this] {
-        Handler([&] {
+        Handled([&] {
             Selected()->Load();
             Link().ApplyChanges(true);
         });
     });
     connect(cmdStore, &QPushButton::clicked, this, [this] {
-        Handler([&] {
+        Handled([&] {
             Selected()->Store();
             Changed(true);
         });
     });
     connect(cmdDefaults, &QPushButton::clicked, this, [this] {
-        Handler([&] {
+        Handled([&] {
             Props().InitProperties();
             Link().AlertChanges();
             Changed(true);
         });
     });
     connect(cmdExport, &QToolButton::clicked, this, [this] {
-        Handler([&] {
+        Handled([&] {
             CCommonDialog dialog = FileDialog(tr("Export QZ IVI Configuration as ..."),
                                               CCommonDialog::cdlOFNOverwritePrompt);
             if (dialog.ShowSave(this)) Selected()->Export(dialog.FileName.toStdString());
         });
     });
     connect(cmdImport, &QToolButton::clicked, this, [this] {
-        Handler([&] {
+        Handled([&] {
             CCommonDialog dialog = FileDialog(tr("Import QZ IVI Configuration..."),
                                               CCommonDialog::cdlOFNFileMustExist);
             const bool chosen = dialog.ShowOpen(this);
@@ -158,16 +159,7 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
             if (chosen) Selected()->Import(dialog.FileName.toStdString());
         });
     });
-    connect(cmdVerifyConfig, &QToolButton::clicked, this, [this] { Handler([&] { Verify(); }); });
-}
-
-template <typename F>
-void PIviConfigurations::Handler(F&& action) {
-    try {
-        action();
-    } catch (...) {
-        HandleError("", 1, nullptr);
-    }
+    connect(cmdVerifyConfig, &QToolButton::clicked, this, [this] { Handled([&] { Verify(); }); });
 }
 
 void PIviConfigurations::Load() {
@@ -211,13 +203,12 @@ std::shared_ptr<QZIviConfiguration> PIviConfigurations::Selected() {
 }
 
 void PIviConfigurations::Validate(std::int32_t index, std::string& text, bool& cancel) {
-    Handler([&] {
+    Handled([&] {
         auto& configurations = *Props().Configurations();
-        const bool blank = text.find_first_not_of(' ') == std::string::npos;
-        const bool taken =
-            std::any_of(configurations.begin(), configurations.end(),
-                        [&](const auto& configuration) { return configuration->Name() == text; });
-        if (!cancel && !blank && !taken) {
+        const auto named =
+            std::find_if(configurations.begin(), configurations.end(),
+                         [&](const auto& configuration) { return configuration->Name() == text; });
+        if (!cancel && !RenameRefused(text, named == configurations.end() ? -1 : 0)) {
             configurations.Item(index + 1)->SetName(text);
             Link().AlertChanges();
         } else {

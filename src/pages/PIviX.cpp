@@ -151,15 +151,13 @@ void PIviX::UpdatePreview() {
 
 // Our configuration tool is the store file itself, in the user's editor.
 void PIviX::OpenConfigurationTool() {
-    try {
+    Handled([&] {
         const std::string path = ivi::EditableConfigStoreFile();
         if (!Editor()(QString::fromStdString(path)))
             ShowMessageBox({"Incorrect version of the Benchmate Console.  Please update to the "
                             "latest version for this functionality.",
                             "", "", 0, BoxIcon::None});
-    } catch (...) {
-        HandleError("", 1, nullptr);
-    }
+    });
 }
 
 } // namespace qzivi

@@ -1,6 +1,7 @@
 #include "qzivi/pages/PropertyPage.h"
 
 #include "qzivi/control/QZIviFgen.h"
+#include "qzivi/driver/ErrorModule.h"
 #include "qzivi/pages/ListHelpers.h"
 #include "qzivi/support/failure.h"
 
@@ -49,6 +50,7 @@ void PropertyPage::NoticeSelectionChanged(const std::vector<QZIviFgen*>& selecte
 }
 
 void PropertyPage::NoticePaint() {
+    Quietly([&] { Painting(); });
     Quietly([&] {
         if (Link().CheckForChanges()) {
             LoadControls();
@@ -72,6 +74,10 @@ void PropertyPage::NoticeEnded() {
 void PropertyPage::Apply() {
     SaveQuietly();
     Link().ApplyChanges(true);
+}
+
+void PropertyPage::ReportFailure() {
+    HandleError("", 1, nullptr);
 }
 
 void PropertyPage::UserChanged() {

@@ -27,6 +27,7 @@ bool CCommonDialog::ShowOpen(QWidget* parent) {
     dialog.setAcceptMode(QFileDialog::AcceptOpen);
     dialog.setFileMode((Flags & cdlOFNFileMustExist) ? QFileDialog::ExistingFile
                                                      : QFileDialog::AnyFile);
+    dialog.setOption(QFileDialog::ReadOnly, Flags & cdlOFNReadOnly);
     dialog.setNameFilters(NameFilters(Filter));
     dialog.setDefaultSuffix(DefaultExt);
     if (dialog.exec() != QDialog::Accepted || dialog.selectedFiles().isEmpty()) return false;

@@ -1,12 +1,10 @@
 // Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
 // of the folder given: grab_widgets docs/images
+#include "qzivi/model/Channels.h"
 #include "qzivi/model/QZIviConfigurations.h"
+#include "qzivi/model/Sequences.h"
 #include "qzivi/pages/CPageHost.h"
-#include "qzivi/pages/PExtensions.h"
-#include "qzivi/pages/PGeneral.h"
-#include "qzivi/pages/PInternal.h"
-#include "qzivi/pages/PIviConfigurations.h"
-#include "qzivi/pages/PIviX.h"
+#include "qzivi/pages/PChannels.h"
 #include "qzivi/panels/Pictures.h"
 #include "qzivi/panels/XUILess.h"
 #include "qzivi/panels/XWinLabel.h"
@@ -20,10 +18,12 @@
 #include <QHBoxLayout>
 #include <QPainter>
 #include <QPixmap>
+#include <QTabBar>
 #include <QTabWidget>
 #include <QTimer>
 
 #include <cmath>
+#include <fstream>
 #include <random>
 
 using namespace qzivi;
@@ -164,25 +164,74 @@ int main(int argc, char** argv) {
         Save(display, folder, name + "error-twice-the-size");
     }
 
-    // Each property page in the page host.
+    // Each property page in the page host, on a tree with two channels, three waveforms (two from
+    // files, one held) and a sequence; the channels page on each tab and in each output mode.
     {
-        QZIviFgenWidget form;
-        form.Control().Extensions(0x3FF);
-        form.Control().UIStyle(1);
-        form.Control().Configurations()->Add("Bench");
-        form.Control().Configurations()->Add("Sweep 1 kHz to 1 MHz");
-        CPageHost host({&form.Control()});
-        for (PropertyPage* page : std::initializer_list<PropertyPage*>{
-                 new PIviX, new PGeneral, new PExtensions, new PInternal, new PIviConfigurations})
-            host.AddPage(page);
-        host.show();
-        const char* const names[] = {"page-control", "page-general", "page-extensions",
-                                     "page-internal", "page-configurations"};
-        for (int i = 0; i < host.Tabs().count(); ++i) {
-            host.Tabs().setCurrentIndex(i);
-            Save(host, folder, names[i]);
+        const QString data = QDir(folder).filePath("pages-data");
+        QDir().mkpath(data);
+        const std::string ramp = QDir(data).filePath("ramp.txt").toStdString();
+        const std::string burst = QDir(data).filePath("burst.txt").toStdString();
+        {
+            std::ofstream r(ramp), b(burst);
+            for (int i = 0; i < 400; ++i) {
+                r << (i % 100) / 50.0 - 1 << "\n";
+                b << std::sin(i * 0.2) * std::exp(-((i - 200) * (i - 200)) / 6000.0) << "\n";
+            }
         }
-        host.reject();
+        QZIviFgenWidget form;
+        QZIviFgen& c = form.Control();
+        c.Extensions(0x3FF);
+        c.UIStyle(1);
+        auto& waveforms = *c.Waveforms();
+        waveforms.Add("Ramp", qzivifgenASCIIFile, ramp);
+        waveforms.Add("Burst", qzivifgenASCIIFile, burst);
+        std::vector<double> held(256);
+        for (std::size_t i = 0; i < held.size(); ++i)
+            held[i] = i < 128 ? std::sin(static_cast<double>(i) * 0.05) : 0.3;
+        waveforms.Add("Held")->Data(held);
+        auto& sequence = *c.Sequences()->Add("Chirp train");
+        sequence.Add(waveforms.Item(1), 3);
+        sequence.Add(waveforms.Item(2), 1);
+        sequence.Add(waveforms.Item(3), 12);
+        for (const char* name : {"CH1", "CH2"}) {
+            auto& channel = *c.Channels()->Add(name);
+            channel.FuncWaveform(qzivifgenWaveformSquare);
+            channel.FuncAmplitude(2);
+            channel.FuncFrequency(1000);
+            channel.FuncDutyCycleHigh(25);
+            channel.AMEnabled(true);
+        }
+        c.Channels()->Item(2)->OutputEnabled(false);
+        c.Configurations()->Add("Bench");
+        c.Configurations()->Add("Sweep 1 kHz to 1 MHz");
+        for (int mode = 0; mode < 3; ++mode) {
+            c.OutputMode(mode);
+            CPageHost host({&c});
+            host.AddStandardPages();
+            host.resize(620, 420);
+            host.show();
+            const char* const names[] = {"page-control",  "page-general",       "page-extensions",
+                                         "page-channels", "page-waveforms",     "page-sequences",
+                                         "page-internal", "page-configurations"};
+            for (int i = 0; i < host.Tabs().count(); ++i) {
+                host.Tabs().setCurrentIndex(i);
+                if (mode > 0 && i != 3) continue;
+                if (i != 3) {
+                    Save(host, folder, names[i]);
+                    continue;
+                }
+                auto* channels = static_cast<PChannels*>(host.Page(i));
+                const char* const tabs[] = {"-output", "-operation", "-modulation"};
+                const char* const modes[] = {"", "-arb", "-sequence"};
+                for (int t = 0; t < (mode == 0 ? 3 : 1); ++t) {
+                    channels->tabChan->setCurrentIndex(t);
+                    Save(host, folder, QString(names[i]) + tabs[t] + modes[mode]);
+                }
+                channels->tabChan->setCurrentIndex(0);
+            }
+            host.reject();
+        }
+        QDir(data).removeRecursively();
     }
 
     // The About box of a control with a session on the simulator, grabbed while it is open.

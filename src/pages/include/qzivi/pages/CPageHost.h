@@ -26,6 +26,8 @@ public:
 
     // Takes the page: created, then selection changed.
     void AddPage(PropertyPage* page);
+    // The control's pages, in the order a designer works through them.
+    void AddStandardPages();
     // Each changed page applies, in tab order; then the page in front is painted.
     void Apply();
 

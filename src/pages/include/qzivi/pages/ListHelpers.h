@@ -4,6 +4,9 @@
 
 #include "qzivi/support/variant.h"
 
+#include <cstdint>
+#include <string>
+
 class QComboBox;
 class QWidget;
 
@@ -22,6 +25,17 @@ Variant ComboValue(const QComboBox& list, const Variant& fallback = Variant::Mis
 // the first entry when `firstAsFallback`, or sets an editable list's text. False when it could do
 // neither: a fixed list without entries.
 bool SelectComboEntry(QComboBox& list, const Variant& value, bool asNumbers, bool firstAsFallback);
+
+// The value a page writes from a list: its item data, else the number its text starts with (0 for
+// none).
+std::int32_t ComboNumber(const QComboBox& list);
+
+// An editable list to an empty text, a fixed one to no selection.
+void ClearCombo(QComboBox& list);
+
+// A rename of a list entry is refused when the text is blank or already the exact name of a
+// member (`indexOfName` is the collection's answer for the text, -1 for none).
+bool RenameRefused(const std::string& text, std::int32_t indexOfName);
 
 // Each child control of the page, in order, hidden and shown again as it was.
 void ForceRedrawControls(QWidget& page);

@@ -37,8 +37,6 @@ protected:
     QWidget* FirstControl() override;
 
 private:
-    template <typename F>
-    void Handler(F&& action);
     void UpdateButtons(bool on);
     std::shared_ptr<QZIviConfiguration> Selected();
     void Verify();

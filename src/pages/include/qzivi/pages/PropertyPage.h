@@ -48,10 +48,35 @@ protected:
     virtual void Apply();
     // Where the focus goes when the page comes to the front.
     virtual QWidget* FirstControl() = 0;
+    // The page comes to the front, before it looks for changes of the other pages.
+    virtual void Painting() {}
+
+    // An event handler of the page: a failure shows as the critical box, and the page stays open.
+    template <typename F>
+    void Handled(F&& action) {
+        try {
+            action();
+        } catch (...) {
+            ReportFailure();
+        }
+    }
 
     // A control changed by the user: the page is changed, unless it is loading.
     void UserChanged();
     bool Loading() const { return m_bLoading; }
+    // Runs `fill` with the loading flag set, so that the controls it fills count as no change.
+    template <typename F>
+    void WhileLoading(F&& fill) {
+        const bool was = m_bLoading;
+        m_bLoading = true;
+        try {
+            fill();
+        } catch (...) {
+            m_bLoading = was;
+            throw;
+        }
+        m_bLoading = was;
+    }
     void LoadControls();
     // Save with its failure ignored, as an apply does.
     void SaveQuietly();
@@ -60,6 +85,8 @@ protected:
     const std::vector<QZIviFgen*>& SelectedControls() const { return m_vSelected; }
 
 private:
+    static void ReportFailure();
+
     QString m_sCaption;
     std::unique_ptr<CPPObjWrapper> m_oLink;
     std::vector<QZIviFgen*> m_vSelected;

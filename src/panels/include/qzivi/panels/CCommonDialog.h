@@ -13,6 +13,7 @@ namespace qzivi {
 class CCommonDialog {
 public:
     enum Flags : int {
+        cdlOFNReadOnly = 0x1,
         cdlOFNOverwritePrompt = 0x2,
         cdlOFNFileMustExist = 0x1000,
     };
