@@ -426,6 +426,7 @@ void QZIviFgen::RegisterSelectionChanged() {
 void QZIviFgen::RegisterApplyChanges() {
     PageFrame("RegisterApplyChanges", [&] {
         auto next = m_oPropCopy->Clone(nullptr);
+        next->OwnReferences(); // the working copy may go; the live tree must not lean on it
         next->SetPath(m_sDisplayName);
         if (m_oUI) m_oUI->SetNewPropSet(next);
         m_oIO->SetNewPropSet(next);

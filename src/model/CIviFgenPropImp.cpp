@@ -6,6 +6,8 @@
 #include "qzivi/model/PropertyBag.h"
 #include "qzivi/support/failure.h"
 
+#include <unordered_map>
+
 namespace qzivi {
 
 std::shared_ptr<CIviFgenPropImp> CIviFgenPropImp::Create() {
@@ -111,6 +113,50 @@ CIviFgenPropImp::Clone(std::shared_ptr<CIviFgenPropImp> target) const {
     m_oChannels->Clone(*target->m_oChannels);
     m_oConfigurations->Clone(*target->m_oConfigurations);
     return target;
+}
+
+namespace {
+
+// The members of a collection by unique id, ignoring case as the tree compares them.
+template <typename Collection>
+auto ByUniqueId(const Collection& collection) {
+    using Ptr = std::decay_t<decltype(*collection.begin())>;
+    std::unordered_map<std::string, Ptr, NoCaseHash, NoCaseEqual> index;
+    for (const auto& member : collection)
+        index.emplace(member->UniqueId(), member);
+    return index;
+}
+
+// The twin of `object` in `index`, or `object` itself when it is of this tree or has no twin.
+template <typename Index, typename Ptr>
+Ptr Twin(const Index& index, const Ptr& object, bool own) {
+    if (!object || own) return object;
+    const auto found = index.find(object->UniqueId());
+    return found == index.end() ? object : found->second;
+}
+
+} // namespace
+
+void CIviFgenPropImp::OwnReferences() {
+    const auto waveforms = ByUniqueId(*m_oWaveforms);
+    const auto sequences = ByUniqueId(*m_oSequences);
+    for (const auto& channel : *m_oChannels) {
+        const auto& waveform = channel->ArbWaveform();
+        if (auto twin = Twin(waveforms, waveform, waveform && m_oWaveforms->Holds(*waveform));
+            twin != waveform)
+            channel->ArbWaveform(twin);
+        const auto& sequence = channel->Sequence();
+        if (auto twin = Twin(sequences, sequence, sequence && m_oSequences->Holds(*sequence));
+            twin != sequence)
+            channel->Sequence(twin);
+    }
+    for (const auto& sequence : *m_oSequences)
+        for (const auto& item : *sequence) {
+            const auto& waveform = item->Waveform();
+            if (auto twin = Twin(waveforms, waveform, waveform && m_oWaveforms->Holds(*waveform));
+                twin != waveform)
+                item->Waveform(twin);
+        }
 }
 
 void CIviFgenPropImp::Attach(std::shared_ptr<CIviErrorReport> errorReport) {

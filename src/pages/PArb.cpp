@@ -118,6 +118,7 @@ PArb::PArb(QWidget* parent) : PropertyPage(tr("Waveforms"), parent) {
         Handled([&] {
             Changed(true);
             Props().Waveforms()->Add(lstWaveforms->item(index)->text().toStdString());
+            Link().AlertChanges(); // the channels page offers it at once
             m_lCurrent = m_lRemembered = index;
             ShowWaveform();
             EnableFields(true);
@@ -314,7 +315,10 @@ void PArb::SaveFields(int index) {
     }
     waveform->PersistedWfmSource(std::to_string(format));
     waveform->AutoNormalizeMode(ComboValue(*cmbAutoNormalize).AsInt32());
-    if (file.empty()) WhileLoading([&] { chkPersist->setChecked(false); });
+    // Without a file a waveform falls back to the file source, unless it holds points that
+    // never came from a file: those would be lost.
+    const bool heldFromCode = waveform->DataGotOnce() && waveform->Filename().empty();
+    if (file.empty() && !heldFromCode) WhileLoading([&] { chkPersist->setChecked(false); });
     waveform->Source(chkPersist->isChecked() ? qzivifgenpersisted : format);
     waveform->Filename(file);
 }

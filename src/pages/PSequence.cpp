@@ -99,6 +99,7 @@ void PSequence::ConnectEvents() {
         Handled([&] {
             Changed(true);
             Props().Sequences()->Add(lstSequence->item(index)->text().toStdString());
+            Link().AlertChanges(); // the channels page offers it at once
             m_lCurrent = m_lRemembered = index;
             EnableControls(true);
         });

@@ -8,11 +8,13 @@ namespace qzivi {
 QStringList CCommonDialog::NameFilters(const QString& filter) {
     const QStringList parts = filter.split(QLatin1Char('|'));
     QStringList filters;
+    // "*.*" means every file where the filter comes from; here it would miss names without a dot.
+    const auto local = [](QString text) { return text.replace(QStringLiteral("*.*"), "*"); };
     for (qsizetype i = 0; i + 1 < parts.size(); i += 2) {
         const QString patterns = QString(parts[i + 1]).replace(QLatin1Char(';'), QLatin1Char(' '));
         // "Text files (*.txt)" already names its patterns; "All files" gets them added.
-        filters << (parts[i].contains(QLatin1Char('(')) ? parts[i]
-                                                        : parts[i] + " (" + patterns + ")");
+        filters << local(parts[i].contains(QLatin1Char('(')) ? parts[i]
+                                                             : parts[i] + " (" + patterns + ")");
     }
     return filters;
 }

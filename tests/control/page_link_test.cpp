@@ -4,6 +4,7 @@
 #include "fake_host.h"
 #include "qzivi/control/PageLink.h"
 #include "qzivi/model/PropertyBag.h"
+#include "qzivi/model/Sequences.h"
 #include "qzivi/support/failure.h"
 
 #include <gmock/gmock.h>
@@ -129,6 +130,37 @@ TEST_F(PageLinkTest, TwoAppliesInARowGiveTwoLiveSetsEqualToTheCopy) {
     EXPECT_NE(control_.Channels(), firstChannels);
     EXPECT_TRUE(LiveBag() == first);
     EXPECT_EQ(control_.Channels()->Item(1)->FuncAmplitude(), 3.5);
+}
+
+// The live set that an apply makes refers to its own waveforms and sequences, not to the copy's:
+// Configure sets the instrument's handles on those, and the copy goes when the pages close.
+TEST_F(PageLinkTest, AnAppliedTreeStandsAloneAndConfiguresAfterTheCopyIsGone) {
+    const std::string file =
+        store_.Write("levels.txt", "0.5\n0.25\n0.5\n0.25\n0.5\n0.25\n0.5\n0.25\n");
+    control_.Channels()->Item(1)->Name("1");
+    {
+        CPPObjWrapper page;
+        page.SelectionChanged(control_);
+        auto& copy = *page.Props();
+        copy.Extensions(0x3FF);
+        copy.OutputMode(qzivifgenOutputSeq);
+        const auto waveform = copy.Waveforms()->Add("Levels", qzivifgenASCIIFile, file);
+        const auto sequence = copy.Sequences()->Add("Twice");
+        sequence->Add(waveform, 2);
+        copy.Channels()->Item(1)->ArbWaveform(waveform);
+        copy.Channels()->Item(1)->Sequence(sequence);
+        page.ApplyChanges(false);
+    }
+    auto& live = *control_.Channels()->Item(1);
+    EXPECT_EQ(live.ArbWaveform(), control_.Waveforms()->Item(1));
+    EXPECT_EQ(live.Sequence(), control_.Sequences()->Item(1));
+    EXPECT_EQ(control_.Sequences()->Item(1)->SequenceItem(1)->Waveform(),
+              control_.Waveforms()->Item(1));
+    control_.Init();
+    control_.Configure();
+    EXPECT_NE(control_.Waveforms()->Item(1)->WaveformHandle(), 0);
+    EXPECT_NE(control_.Sequences()->Item(1)->SequenceHandle(), 0);
+    EXPECT_EQ(control_.Engine().RenderOutput("1", 0, 0, 1).size(), 1u);
 }
 
 TEST_F(PageLinkTest, AnApplyThatChangesTheStyleSwapsThePanelOntoTheNewSet) {

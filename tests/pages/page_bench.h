@@ -6,6 +6,7 @@
 #include "qzivi/control/QZIviFgen.h"
 #include "qzivi/driver/ErrorModule.h"
 #include "qzivi/pages/CPageHost.h"
+#include "qzivi/panels/MessageBoxes.h"
 
 #include <QApplication>
 #include <QComboBox>
@@ -23,6 +24,9 @@ class PageBench {
 public:
     PageBench() {
         ::setenv("QZIVI_SESSION_MANAGER", "none", 1);
+        InstallQtMessageBoxes(); // before the scope, which then wins
+        boxScope = std::make_unique<MessageBoxScope>(
+            [this](const MessageBoxRequest& r) { boxes.push_back(r); });
         control = std::make_unique<QZIviFgen>();
         control->InitProperties();
         control->ExceptionOnError(false);
@@ -31,6 +35,7 @@ public:
     ~PageBench() {
         host.reset();
         control.reset();
+        boxScope.reset();
     }
 
     // The host with every page, showing the page of type T.
@@ -59,10 +64,15 @@ public:
         box->selectAll();
         QTest::keyClicks(box, text);
     }
-    // Typed and ended with Return, as a user finishes a field.
+    // Typed and ended with Return, as a rename box takes it.
     static void Enter(QLineEdit* box, const QString& text) {
         Type(box, text);
         QTest::keyClick(box, Qt::Key_Return);
+    }
+    // Typed and left, as a user finishes a field (Return there would press the host's OK).
+    static void Finish(QLineEdit* box, const QString& text) {
+        Type(box, text);
+        emit box->editingFinished();
     }
     static bool Choose(QComboBox* list, const QString& text) {
         const int at = list->findText(text);
@@ -100,9 +110,17 @@ public:
         });
     }
 
+    // The text of the boxes shown so far, for a failure message.
+    std::string BoxTexts() const {
+        std::string texts;
+        for (const auto& box : boxes)
+            texts += box.text + "\n";
+        return texts;
+    }
+
     StoreScope store;
     std::vector<MessageBoxRequest> boxes;
-    MessageBoxScope boxScope{[this](const MessageBoxRequest& r) { boxes.push_back(r); }};
+    std::unique_ptr<MessageBoxScope> boxScope;
     std::unique_ptr<QZIviFgen> control;
     std::unique_ptr<CPageHost> host;
 };

@@ -34,6 +34,10 @@ public:
                          bool withConfigurations) const;
     // Fills `target` (a new set if none) and returns it.
     std::shared_ptr<CIviFgenPropImp> Clone(std::shared_ptr<CIviFgenPropImp> target) const;
+    // A clone refers to the waveforms and sequences of the tree it came from. This makes each
+    // such reference one to the twin of the same unique id in this tree, so that the tree stands
+    // alone: the instrument's handles that Configure sets are on the objects its channels use.
+    void OwnReferences();
 
     double ArbSampleRate() const { return m_dArbSampleRate; }
     void ArbSampleRate(double value) { Put(kArbSampleRate, value); }
