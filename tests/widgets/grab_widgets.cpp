@@ -4,6 +4,7 @@
 #include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/model/Sequences.h"
 #include "qzivi/pages/CPageHost.h"
+#include "qzivi/pages/PArb.h"
 #include "qzivi/pages/PChannels.h"
 #include "qzivi/panels/Pictures.h"
 #include "qzivi/panels/XUILess.h"
@@ -16,6 +17,8 @@
 #include <QApplication>
 #include <QDir>
 #include <QHBoxLayout>
+#include <QListWidget>
+#include <QMouseEvent>
 #include <QPainter>
 #include <QPixmap>
 #include <QTabBar>
@@ -38,6 +41,16 @@ void Save(QWidget& widget, const QString& folder, const QString& name) {
         pixmap.fill(widget.palette().color(QPalette::Window));
         widget.render(&pixmap);
         pixmap.save(QDir(folder).filePath(QStringLiteral("%1@%2x.png").arg(name).arg(ratio)));
+    }
+}
+
+// A click of the left button, as the mouse gives it.
+void Click(QWidget& widget, QPoint at) {
+    for (const QEvent::Type type : {QEvent::MouseButtonPress, QEvent::MouseButtonRelease}) {
+        QMouseEvent event(type, at, widget.mapToGlobal(at), Qt::LeftButton,
+                          type == QEvent::MouseButtonPress ? Qt::LeftButton : Qt::NoButton,
+                          Qt::NoModifier);
+        QApplication::sendEvent(&widget, &event);
     }
 }
 
@@ -218,6 +231,11 @@ int main(int argc, char** argv) {
                 if (mode > 0 && i != 3) continue;
                 if (i != 3) {
                     Save(host, folder, names[i]);
+                    if (auto* arb = qobject_cast<PArb*>(host.Page(i))) { // the held points too
+                        QListWidget& list = *arb->lstWaveforms;
+                        Click(*list.viewport(), list.visualItemRect(list.item(2)).center());
+                        Save(host, folder, "page-waveforms-held");
+                    }
                     continue;
                 }
                 auto* channels = static_cast<PChannels*>(host.Page(i));
