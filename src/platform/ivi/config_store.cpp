@@ -116,13 +116,22 @@ void RefuseIfWritableByOthers(const std::string& path, std::string_view what) {
                               "remove that permission (chmod o-w)");
 }
 
-std::string FindConfigStoreFile() {
-    if (const std::string named = Env("QZIVI_CONFIG_STORE"); !named.empty()) return named;
+std::vector<std::string> ConfigStoreSearchOrder() {
+    if (const std::string named = Env("QZIVI_CONFIG_STORE"); !named.empty()) return {named};
+    std::vector<std::string> order;
     std::string home = Env("XDG_CONFIG_HOME");
     if (home.empty() && !Env("HOME").empty()) home = Env("HOME") + "/.config";
-    if (!home.empty() && Exists(home + "/qzivi/qzivi.conf")) return home + "/qzivi/qzivi.conf";
-    const std::string system = std::string(QZIVI_SYSCONFDIR) + "/qzivi.conf";
-    return Exists(system) ? system : std::string();
+    if (!home.empty()) order.push_back(home + "/qzivi/qzivi.conf");
+    order.push_back(std::string(QZIVI_SYSCONFDIR) + "/qzivi.conf");
+    return order;
+}
+
+std::string FindConfigStoreFile() {
+    const auto order = ConfigStoreSearchOrder();
+    if (!Env("QZIVI_CONFIG_STORE").empty()) return order.front(); // named: it must be there
+    for (const auto& path : order)
+        if (Exists(path)) return path;
+    return {};
 }
 
 std::string EditableConfigStoreFile() {

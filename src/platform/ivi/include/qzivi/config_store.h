@@ -48,6 +48,10 @@ struct ConfigStore {
 // and the line. The embedded default is added.
 ConfigStore ParseConfigStore(std::string_view text, const std::string& path);
 
+// The files the class driver looks for, in order: the one QZIVI_CONFIG_STORE names alone, when
+// it names one.
+std::vector<std::string> ConfigStoreSearchOrder();
+
 // The path the search order gives, or "" if no file exists.
 std::string FindConfigStoreFile();
 
