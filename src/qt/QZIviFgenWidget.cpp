@@ -124,7 +124,7 @@ void QZIviFgenWidget::RemoveChild(const std::string&) {
 }
 
 QSize QZIviFgenWidget::sizeHint() const {
-    return m_oPanelWidget ? m_oPanelWidget->size() : QSize(29, 29);
+    return m_oPanelWidget ? m_oPanelWidget->sizeHint() : QSize(29, 29); // as the panel was drawn
 }
 
 void QZIviFgenWidget::PropertyChanged(const std::string& name) {

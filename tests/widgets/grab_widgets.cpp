@@ -1,5 +1,6 @@
 // Renders the widgets as a person sees them, at one and two device pixels a pixel, into PNG files
 // of the folder given: grab_widgets docs/images
+#include "PanelWindow.h"
 #include "qzivi/model/Channels.h"
 #include "qzivi/model/QZIviConfigurations.h"
 #include "qzivi/model/Sequences.h"
@@ -250,6 +251,21 @@ int main(int argc, char** argv) {
             host.reject();
         }
         QDir(data).removeRecursively();
+    }
+
+    // The front panel program on the example configuration, generating.
+    {
+        const QString example = QStringLiteral(QZIVI_SOURCE_DIR "/examples/two-channels.qzc");
+        qzfgen::PanelWindow window("SampleFGen");
+        window.resize(1180, 560);
+        window.show();
+        window.OpenFile(example);
+        window.Init();
+        window.Configure();
+        window.Initiate();
+        window.RefreshScope();
+        Save(window, folder, "qzfgen-panel");
+        window.close();
     }
 
     // The About box of a control with a session on the simulator, grabbed while it is open.
