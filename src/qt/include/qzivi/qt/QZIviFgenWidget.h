@@ -1,8 +1,8 @@
 // QZIviFgenWidget: the control on a Qt form. It hosts one QZIviFgen and serves it as its host
 // (user mode, display name, size, the panel made by class name, visibility, the Tab key, the
 // About box). The root's values are properties of the widget, made from the root's property table,
-// and the whole tree is one more property, `propertyBag`, holding the bag's contents: a .ui file
-// keeps everything. The control's events are Qt signals.
+// and the whole tree is one more property: `propertyBag` holds the bag's bytes for code, and
+// `configuration` the same as text, which a .ui file keeps. The control's events are Qt signals.
 #pragma once
 
 #include "qzivi/control/Host.h"
@@ -19,7 +19,11 @@ namespace qzivi {
 
 class QZIviFgenWidget : public QWidget, private IQZIviFgenHost {
     Q_OBJECT
-    Q_PROPERTY(QByteArray propertyBag READ PropertyBagContents WRITE SetPropertyBagContents)
+    Q_PROPERTY(QByteArray propertyBag READ PropertyBagContents WRITE SetPropertyBagContents
+                   DESIGNABLE false STORED false)
+    // The same bytes as base64 text, which a .ui file can hold and uic code gives back.
+    Q_PROPERTY(QString configuration READ configuration WRITE setConfiguration)
+    Q_PROPERTY(bool userMode READ InUserMode WRITE SetUserMode DESIGNABLE false STORED false)
 
 public:
     // `userMode` false: the control is on a form being designed.
@@ -33,6 +37,10 @@ public:
     // The whole tree as the bag's bytes; a write loads it as a stored instance.
     QByteArray PropertyBagContents() const;
     void SetPropertyBagContents(const QByteArray& contents);
+    QString configuration() const { return QString::fromLatin1(PropertyBagContents().toBase64()); }
+    void setConfiguration(const QString& text) {
+        SetPropertyBagContents(QByteArray::fromBase64(text.toLatin1()));
+    }
 
     // Panels by class name ("QZIviFgenLib.XUIFgen1"): what AddChild makes.
     using PanelMaker = std::function<QWidget*(QWidget* parent)>;
