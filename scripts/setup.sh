@@ -2,7 +2,7 @@
 # Installs what the build needs from Debian's packages; quick when all is there already.
 set -euo pipefail
 packages=(cmake ninja-build g++ ccache clang-format libgtest-dev libgmock-dev libbenchmark-dev
-          qt6-base-dev qt6-svg-dev qt6-tools-dev libqt6opengl6-dev qt6-qpa-plugins libgl-dev fonts-dejavu-core)
+          qt6-base-dev qt6-svg-dev qt6-tools-dev libqt6opengl6-dev qt6-qpa-plugins libgl-dev fonts-dejavu-core pkgconf)
 missing=()
 for p in "${packages[@]}"; do
   dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q "install ok installed" || missing+=("$p")

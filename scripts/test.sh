@@ -11,6 +11,9 @@ echo "== release build and tests"
 scripts/build.sh build/release
 ctest --test-dir build/release --output-on-failure -j 2
 
+echo "== Debian package: made, installed, used and removed"
+scripts/package.sh build/release
+
 echo "== address and undefined-behaviour sanitizer build and tests"
 scripts/build.sh build/sanitize -DQZIVI_SANITIZE=ON -DQZIVI_BUILD_BENCH=OFF -DCMAKE_BUILD_TYPE=Debug
 ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
