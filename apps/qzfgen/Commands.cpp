@@ -6,14 +6,17 @@
 #include "qzivi/config_store.h"
 #include "qzivi/control/QZIviFgen.h"
 #include "qzivi/model/Sequences.h"
+#include "qzivi/model/Waveforms.h"
 #include "qzivi/panels/MUiAndStringUtil.h"
 #include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 #include "qzivi/trace.h"
 
+#include <cmath>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
+#include <optional>
 
 namespace qzfgen {
 
@@ -95,6 +98,77 @@ void PrintOutputs(QZIviFgen& fgen) {
     }
 }
 
+std::vector<std::string> Split(const std::string& list) {
+    std::vector<std::string> parts;
+    std::size_t from = 0;
+    for (std::size_t comma; (comma = list.find(',', from)) != std::string::npos; from = comma + 1)
+        parts.push_back(list.substr(from, comma - from));
+    parts.push_back(list.substr(from));
+    return parts;
+}
+
+void RequireFile(const std::string& path);
+
+// The format of a data file: named by --format, else by its extension (.i16, .i32, else text).
+std::int32_t FormatOf(const std::string& path, const std::optional<std::string>& named) {
+    const std::string name =
+        named ? qzivi::text::Lower(*named) : std::filesystem::path(path).extension().string();
+    if (name == "ascii" || name == "text") return qzivi::qzivifgenASCIIFile;
+    if (name == "int16" || name == ".i16") return qzivi::qzivifgen2ByteInteger;
+    if (name == "int32" || name == ".i32") return qzivi::qzivifgen4ByteInteger;
+    if (named) throw Misuse("--format: \"" + *named + "\" is none of ascii, int16, int32");
+    return qzivi::qzivifgenASCIIFile;
+}
+
+// Waveforms from the data files of --data, their points held in the configuration so that it
+// stands alone; for --mode sequence one sequence of them all with --iterations (1 each by default);
+// every channel plays the first waveform or the sequence.
+void AddArbitrary(QZIviFgen& fgen, const Arguments& args, bool sequence) {
+    const auto data = args.Text("data");
+    if (!data)
+        throw Misuse("--mode " + std::string(sequence ? "sequence" : "arb") +
+                     " needs --data FILE[,FILE...]");
+    const auto files = Split(*data);
+    std::vector<std::int32_t> iterations(files.size(), 1);
+    if (const auto list = args.Text("iterations")) {
+        const auto parts = Split(*list);
+        if (parts.size() != files.size())
+            throw Misuse("--iterations: one count for each data file");
+        for (std::size_t i = 0; i < parts.size(); ++i) {
+            const auto n = ParseNumber(parts[i]);
+            if (!n || *n < 1 || *n != std::floor(*n) || *n > 2147483647.0)
+                throw Misuse("--iterations: \"" + parts[i] + "\" is not a whole number from 1");
+            iterations[i] = static_cast<std::int32_t>(*n);
+        }
+    }
+    fgen.Extensions(fgen.Extensions() | qzivi::qzivifgenArbWfmExt |
+                    (sequence ? qzivi::qzivifgenArbSeqExt : 0));
+    fgen.OutputMode(sequence ? qzivi::qzivifgenOutputSeq : qzivi::qzivifgenOutputArb);
+    if (const auto rate = args.Number("sample-rate")) fgen.ArbSampleRate(*rate);
+    std::shared_ptr<qzivi::QZIviFgenSequence> train;
+    if (sequence) train = fgen.Sequences()->Add();
+    std::shared_ptr<qzivi::QZIviFgenArbWaveform> first;
+    for (std::size_t i = 0; i < files.size(); ++i) {
+        RequireFile(files[i]);
+        qzivi::QZIviFgenArbWaveform file;
+        file.Name(files[i]);
+        file.Source(FormatOf(files[i], args.Text("format")));
+        file.Filename(files[i]);
+        const qzivi::Points points = file.GetDataSample(0, 1, -1);
+        if (!points) throw Misuse("\"" + files[i] + "\" holds no points in that format");
+        const auto waveform =
+            fgen.Waveforms()->Add(std::filesystem::path(files[i]).stem().string());
+        waveform->Data(*points);
+        if (!first) first = waveform;
+        if (train) train->Add(waveform, iterations[i]);
+    }
+    for (const auto& channel : *fgen.Channels()) {
+        channel->ArbWaveform(first);
+        if (train) channel->Sequence(train);
+        channel->ArbGain(1);
+    }
+}
+
 // The settings the options give, on the tree as it stands; the built-in example otherwise.
 void BuildFromOptions(QZIviFgen& fgen, const Arguments& args, bool haveFile) {
     const long long channels = args.Whole("channels", haveFile ? 0 : 2, 0, 64);
@@ -116,6 +190,11 @@ void BuildFromOptions(QZIviFgen& fgen, const Arguments& args, bool haveFile) {
     }
     const auto frequency = args.Number("frequency"), amplitude = args.Number("amplitude"),
                offset = args.Number("offset"), duty = args.Number("duty");
+    const std::string mode = qzivi::text::Lower(args.Text("mode", "function"));
+    if (mode == "arb" || mode == "sequence")
+        AddArbitrary(fgen, args, mode == "sequence");
+    else if (mode != "function")
+        throw Misuse("--mode: \"" + mode + "\" is none of function, arb, sequence");
     int index = 0;
     for (const auto& channel : *fgen.Channels()) {
         auto& c = *channel;
@@ -230,8 +309,10 @@ int Trigger(const std::vector<std::string>& words) {
 }
 
 int Export(const std::vector<std::string>& words) {
-    const Arguments args(
-        words, {"from", "channels", "waveform", "frequency", "amplitude", "offset", "duty"}, {});
+    const Arguments args(words,
+                         {"from", "channels", "waveform", "frequency", "amplitude", "offset",
+                          "duty", "mode", "data", "format", "iterations", "sample-rate"},
+                         {});
     const std::string file = args.Only("file to write");
     Control control;
     const auto from = args.Text("from");
@@ -281,47 +362,62 @@ int Render(const std::vector<std::string>& words) {
     return 0;
 }
 
+// clang-format off
 constexpr Command kCommands[] = {
-    {"names", "the store's logical names, with module, resource and options",
-     "usage: qzfgen names\n\nLists the logical names of the configuration store in use (and "
-     "the\nbuilt-in \"SampleFGen\"), with the module, prefix, resource and options of each.\n",
-     Names},
-    {"store", "the store files searched, in order, and which one is used",
-     "usage: qzfgen store\n\nShows where the class driver looks for its configuration store, in "
-     "order,\nand which of those files exist and which one is in use.\n",
-     Store},
-    {"configure", "applies a .qzc to a generator and tells what its outputs do",
-     "usage: qzfgen configure FILE.qzc [--name LOGICAL] [--trace FILE]\n\nLoads the saved "
-     "configuration, opens the generator (default \"SampleFGen\")\nand sends it all with "
-     "Configure. Prints the driver and what each channel\nnow does. --trace appends every driver "
-     "call to FILE.\n",
-     Configure},
-    {"initiate", "starts generation, after a .qzc if one is given",
-     "usage: qzfgen initiate [FILE.qzc] [--name LOGICAL]\n\nOpens the generator, configures it "
-     "from FILE.qzc if given, and starts the\noutputs.\n",
-     Initiate},
-    {"abort", "stops generation",
-     "usage: qzfgen abort [--name LOGICAL]\n\nOpens the generator and stops its outputs.\n", Abort},
-    {"trigger", "sends a software trigger",
-     "usage: qzfgen trigger [--name LOGICAL]\n\nOpens the generator and sends it a software "
-     "trigger.\n",
-     Trigger},
-    {"export", "writes a .qzc built from options or from another file",
-     "usage: qzfgen export FILE.qzc [--from OTHER.qzc] [--channels N]\n                    "
-     "[--waveform W] [--frequency F] [--amplitude A]\n                    [--offset O] [--duty "
-     "D]\n\nWrites a configuration: the one in OTHER.qzc, or a built-in example of two\nchannels, "
-     "changed by the options for every channel. W is one of sine,\nsquare, triangle, ramp-up, "
-     "ramp-down, dc. Numbers take SI prefixes: 2.5k.\n",
-     Export},
-    {"render", "the simulator's output as CSV or as a picture",
-     "usage: qzfgen render [FILE.qzc] --channel C [--points N] [--rate R]\n                    "
-     "[--start T] [--csv FILE] [--png FILE] [--name LOGICAL]\n\nConfigures the generator from "
-     "FILE.qzc (or the built-in example), starts it\nand writes N samples (default 1000) of "
-     "channel C taken R times a second\n(default 1M) from T seconds on: as CSV to FILE or standard "
-     "output, and as a\nplot picture with --png. Needs a driver that renders, as the simulator "
-     "does.\n",
-     Render},
+    {"names", "the store's logical names, with module, resource and options", R"(usage: qzfgen names
+
+Lists the logical names of the configuration store in use (and the
+built-in "SampleFGen"), with the module, prefix, resource and options of each.
+)", Names},
+    {"store", "the store files searched, in order, and which one is used", R"(usage: qzfgen store
+
+Shows where the class driver looks for its configuration store, in order,
+and which of those files exist and which one is in use.
+)", Store},
+    {"configure", "applies a .qzc to a generator and tells what its outputs do", R"(usage: qzfgen configure FILE.qzc [--name LOGICAL] [--trace FILE]
+
+Loads the saved configuration, opens the generator (default "SampleFGen")
+and sends it all with Configure. Prints the driver and what each channel
+now does. --trace appends every driver call to FILE.
+)", Configure},
+    {"initiate", "starts generation, after a .qzc if one is given", R"(usage: qzfgen initiate [FILE.qzc] [--name LOGICAL]
+
+Opens the generator, configures it from FILE.qzc if given, and starts the
+outputs.
+)", Initiate},
+    {"abort", "stops generation", R"(usage: qzfgen abort [--name LOGICAL]
+
+Opens the generator and stops its outputs.
+)", Abort},
+    {"trigger", "sends a software trigger", R"(usage: qzfgen trigger [--name LOGICAL]
+
+Opens the generator and sends it a software trigger.
+)", Trigger},
+    {"export", "writes a .qzc built from options or from another file", R"(usage: qzfgen export FILE.qzc [--from OTHER.qzc] [--channels N]
+                    [--waveform W] [--frequency F] [--amplitude A]
+                    [--offset O] [--duty D]
+                    [--mode arb|sequence --data FILE[,FILE...]
+                     [--format ascii|int16|int32] [--iterations N[,N...]]
+                     [--sample-rate R]]
+
+Writes a configuration: the one in OTHER.qzc, or a built-in example of two
+channels, changed by the options for every channel. W is one of sine,
+square, triangle, ramp-up, ramp-down, dc. Numbers take SI prefixes: 2.5k.
+With --mode arb the channels play the first data file's points, with
+--mode sequence a sequence of all of them; the points are kept in the
+configuration. A file's format follows its extension (.i16, .i32, else
+text) unless --format names it.
+)", Export},
+    {"render", "the simulator's output as CSV or as a picture", R"(usage: qzfgen render [FILE.qzc] --channel C [--points N] [--rate R]
+                    [--start T] [--csv FILE] [--png FILE] [--name LOGICAL]
+
+Configures the generator from FILE.qzc (or the built-in example), starts it
+and writes N samples (default 1000) of channel C taken R times a second
+(default 1M) from T seconds on: as CSV to FILE or standard output, and as a
+plot picture with --png. Needs a driver that renders, as the simulator does.
+)", Render},
 };
+// clang-format on
 
 } // namespace
 

@@ -5,6 +5,8 @@
 #include <gtest/gtest.h>
 
 #include <cmath>
+#include <cstdio>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <sys/wait.h>
@@ -114,6 +116,46 @@ TEST_F(QzfgenTest, AnExportedFileConfiguresAndTellsWhatEachChannelDoes) {
     EXPECT_NE(ran.out.find("Channel2: Square 2.500 kHz, 3.000 Vpp, offset -500.000 mV, duty 25 %"),
               std::string::npos)
         << ran.out;
+}
+
+TEST_F(QzfgenTest, EverySampleConfigurationConfigures) {
+    int samples = 0;
+    for (const auto& entry : std::filesystem::directory_iterator(QZIVI_SOURCE_DIR "/examples")) {
+        if (entry.path().extension() != ".qzc") continue;
+        const Ran ran = Run("configure " + entry.path().string());
+        EXPECT_EQ(ran.code, 0) << entry.path() << ": " << ran.err;
+        EXPECT_EQ(ran.out.find("output off"), std::string::npos) << ran.out;
+        ++samples;
+    }
+    EXPECT_GE(samples, 4);
+}
+
+// Data files of each format become held waveforms; a sequence plays them in order.
+TEST_F(QzfgenTest, ASequenceFromDataFilesPlaysThemInOrder) {
+    // A is high then low, B low then high: the order shows in the samples.
+    store_.Write("high.txt", "1\n1\n1\n1\n0\n0\n0\n0\n");
+    std::string low;
+    for (int i = 0; i < 8; ++i)
+        low += i < 4 ? std::string("\x00\x00", 2) : std::string("\x00\x20", 2);
+    store_.Write("low.i16", low);
+    const std::string file = Path("train.qzc");
+    Ran ran = Run("export " + file + " --mode sequence --data " + Path("high.txt") + "," +
+                  Path("low.i16") + " --iterations 1,2 --sample-rate 1M");
+    ASSERT_EQ(ran.code, 0) << ran.err;
+    std::remove(Path("high.txt").c_str()); // the points are in the configuration now
+    ran = Run("render " + file + " --channel Channel1 --points 24 --rate 1M --start 0.5u");
+    ASSERT_EQ(ran.code, 0) << ran.err;
+    std::istringstream lines(ran.out);
+    std::string line;
+    std::getline(lines, line);
+    for (int k = 0; std::getline(lines, line); ++k) {
+        const double v = std::stod(line.substr(line.find(',') + 1));
+        // Normalised on reading: each waveform's peak becomes 1. A once, then B twice.
+        const bool high = k < 8 ? k < 4 : (k % 8) >= 4;
+        EXPECT_NEAR(v, high ? 1.0 : 0.0, 1e-9) << "sample " << k;
+    }
+    EXPECT_EQ(Run("export x.qzc --mode sequence").code, 2);
+    EXPECT_EQ(Run("export x.qzc --mode arb --data " + Path("low.i16") + " --format int64").code, 2);
 }
 
 TEST_F(QzfgenTest, NamesAndStoreShowTheStoreInUse) {
