@@ -211,18 +211,8 @@ void CCollectionUIMgr::EndRename(bool cancel) {
 }
 
 bool CCollectionUIMgr::eventFilter(QObject* watched, QEvent* event) {
-    if (m_oEditBox && watched == m_oEditBox) {
-        if (event->type() == QEvent::KeyPress) {
-            const int key = static_cast<QKeyEvent*>(event)->key();
-            if (key == Qt::Key_Return || key == Qt::Key_Enter || key == Qt::Key_Escape) {
-                EndRename(key == Qt::Key_Escape);
-                return true;
-            }
-        } else if (event->type() == QEvent::FocusOut) {
-            EndRename(false);
-        }
-        return false;
-    }
+    if (m_oEditBox && watched == m_oEditBox)
+        return EndsEdit(event, [this](bool cancel) { EndRename(cancel); });
     if (!m_oList) return false;
     if (watched == m_oList && event->type() == QEvent::KeyPress) {
         const int key = static_cast<QKeyEvent*>(event)->key();

@@ -287,18 +287,8 @@ void CIviFgenSeqPageImp::EndCellEdit(bool cancel) {
 }
 
 bool CIviFgenSeqPageImp::eventFilter(QObject* watched, QEvent* event) {
-    if (m_oCellEdit && watched == m_oCellEdit) {
-        if (event->type() == QEvent::KeyPress) {
-            const int key = static_cast<QKeyEvent*>(event)->key();
-            if (key == Qt::Key_Return || key == Qt::Key_Enter || key == Qt::Key_Escape) {
-                EndCellEdit(key == Qt::Key_Escape);
-                return true;
-            }
-        } else if (event->type() == QEvent::FocusOut) {
-            EndCellEdit(false);
-        }
-        return false;
-    }
+    if (m_oCellEdit && watched == m_oCellEdit)
+        return EndsEdit(event, [this](bool cancel) { EndCellEdit(cancel); });
     if (!m_oTable || (watched != m_oTable && watched != m_oTable->viewport()))
         return CCollectionUIMgr::eventFilter(watched, event);
     if (watched == m_oTable && event->type() == QEvent::KeyPress) {

@@ -51,7 +51,7 @@ void CheckFile(const std::string& path) {
 
 } // namespace
 
-PArb::PArb(QWidget* parent) : PropertyPage(tr("Waveforms"), parent) {
+PArb::PArb(QWidget* parent) : NamedListPage(tr("Waveforms"), parent) {
     lstWaveforms = Made(new QListWidget(this), "lstWaveforms", tr("Selects a waveform."));
     lblWaveform = Made(new QLabel(tr("Waveforms:"), this), "lblWaveform");
     lblWaveform->setBuddy(lstWaveforms);
@@ -110,50 +110,7 @@ PArb::PArb(QWidget* parent) : PropertyPage(tr("Waveforms"), parent) {
 
     m_oLUI.Attach(lstWaveforms, cmdAdd, cmdDel, txtRename);
     m_oLUI.BaseName("Waveform");
-    m_vEvents.push_back(m_oLUI.BeforeAdd.Connect([this](std::string&) {
-        if (lstWaveforms->count() > 0 && !Loading()) Handled([&] { SaveFields(m_lCurrent); });
-    }));
-    m_vEvents.push_back(m_oLUI.ItemAdded.Connect([this](std::int32_t index) {
-        if (Loading()) return;
-        Handled([&] {
-            Changed(true);
-            Props().Waveforms()->Add(lstWaveforms->item(index)->text().toStdString());
-            Link().AlertChanges(); // the channels page offers it at once
-            m_lCurrent = m_lRemembered = index;
-            ShowWaveform();
-            EnableFields(true);
-        });
-    }));
-    m_vEvents.push_back(m_oLUI.BeforeRemove.Connect([this](std::int32_t) { m_bRemoving = true; }));
-    m_vEvents.push_back(m_oLUI.ItemRemoved.Connect([this](std::int32_t index) {
-        if (!Loading())
-            Handled([&] {
-                Changed(true);
-                Props().Waveforms()->Remove(index + 1);
-                m_lCurrent = m_lRemembered = std::max(0, lstWaveforms->currentRow());
-                EnableFields(true);
-                if (lstWaveforms->count() > 0) ShowWaveform();
-                Link().AlertChanges();
-            });
-        m_bRemoving = false;
-    }));
-    m_vEvents.push_back(m_oLUI.ListItemSelected.Connect([this](std::int32_t& index) {
-        const int left = m_lCurrent;
-        m_lCurrent = index;
-        if (Loading()) return;
-        Handled([&] {
-            if (index >= 0 && index < Props().Waveforms()->Count()) {
-                // The fields go into the waveform left behind, not into the one selected.
-                if (!m_bRemoving && left != index) SaveFields(left);
-                ShowWaveform();
-            }
-            m_lRemembered = index;
-        });
-    }));
-    m_vEvents.push_back(
-        m_oLUI.Validate.Connect([this](std::int32_t& index, std::string& text, bool& cancel) {
-            Handled([&] { Validate(index, text, cancel); });
-        }));
+    WireList(m_oLUI, lstWaveforms);
 
     for (QComboBox* list : {cmbWfmSource, cmbAutoNormalize})
         connect(list, &QComboBox::currentIndexChanged, this, [this] {
@@ -170,12 +127,8 @@ PArb::PArb(QWidget* parent) : PropertyPage(tr("Waveforms"), parent) {
     connect(cmdFile, &QToolButton::clicked, this, [this] { Handled([&] { Browse(); }); });
 }
 
-std::shared_ptr<QZIviFgenArbWaveform> PArb::WaveformAt(int index) {
-    const QListWidgetItem* entry = lstWaveforms->item(index);
-    if (!entry) return nullptr;
-    auto& waveforms = *Props().Waveforms();
-    const std::int32_t position = waveforms.IndexOfName(entry->text().toStdString());
-    return position == -1 ? nullptr : waveforms.Item(position);
+QZIviFgenArbWaveforms& PArb::Entries() {
+    return *Props().Waveforms();
 }
 
 void PArb::Load() {
@@ -194,19 +147,19 @@ void PArb::Load() {
     for (const auto& waveform : waveforms)
         m_oLUI.Add(waveform->Name());
     if (lstWaveforms->count() > 0) {
-        m_lCurrent = std::clamp(m_lRemembered, 0, lstWaveforms->count() - 1);
+        m_lCurrent = RememberedEntry();
         lstWaveforms->setCurrentRow(m_lCurrent);
-        ShowWaveform();
+        ShowEntry();
     } else {
         m_lCurrent = 0;
         qzgrphPreview->ClearData();
         lblPreview->clear();
     }
-    EnableFields(on);
+    EnableEntries(on);
 }
 
-void PArb::ShowWaveform() {
-    const auto waveform = WaveformAt(lstWaveforms->currentRow());
+void PArb::ShowEntry() {
+    const auto waveform = EntryAt(lstWaveforms->currentRow());
     if (!waveform) return;
     WhileLoading([&] {
         SelectComboEntry(*cmbWfmSource, Variant(waveform->PersistedWfmSource()).AsInt32(), true,
@@ -219,7 +172,7 @@ void PArb::ShowWaveform() {
 }
 
 Points PArb::FieldPoints() {
-    return PointsOfFields(WaveformAt(m_lCurrent).get());
+    return PointsOfFields(EntryAt(m_lCurrent).get());
 }
 
 Points PArb::PointsOfFields(QZIviFgenArbWaveform* model) {
@@ -304,8 +257,8 @@ void PArb::Browse() {
 
 // Into the waveform of entry `index`. A file name that changed must give points, else nothing of
 // the waveform changes.
-void PArb::SaveFields(int index) {
-    const auto waveform = WaveformAt(index);
+void PArb::SaveEntry(int index) {
+    const auto waveform = EntryAt(index);
     if (!waveform) return;
     const std::string file = txtFileName->text().toStdString();
     const std::int32_t format = ComboValue(*cmbWfmSource).AsInt32();
@@ -324,27 +277,14 @@ void PArb::SaveFields(int index) {
 }
 
 void PArb::Save() {
-    if (lstWaveforms->count() > 0) SaveFields(m_lCurrent);
+    if (lstWaveforms->count() > 0) SaveEntry(m_lCurrent);
 }
 
 void PArb::Apply() {
-    m_bAppliedByRename = false;
     m_oLUI.CommitRename();
     Handled([&] { Save(); });
     // A rename that the validation ended goes along: OK must not lose it.
     Link().ApplyChanges(true);
-}
-
-void PArb::Validate(std::int32_t index, std::string& text, bool& cancel) {
-    auto& waveforms = *Props().Waveforms();
-    if (cancel || RenameRefused(text, waveforms.IndexOfName(text))) {
-        cancel = true;
-    } else {
-        waveforms.Item(index + 1)->Name(text);
-        Link().AlertChanges();
-    }
-    Changed(true);
-    m_bAppliedByRename = true;
 }
 
 void PArb::ClearFields() {
@@ -356,7 +296,7 @@ void PArb::ClearFields() {
     });
 }
 
-void PArb::EnableFields(bool on) {
+void PArb::EnableEntries(bool on) {
     if (!on) ClearFields();
     m_oLUI.Enabled(on);
     lstWaveforms->setEnabled(on);

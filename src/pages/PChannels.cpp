@@ -414,10 +414,7 @@ void PChannels::Apply() {
 }
 
 void PChannels::Write(bool spareValidation) {
-    if (!spareValidation) {
-        m_bRenameEnded = false;
-        m_oLUI.CommitRename();
-    }
+    if (!spareValidation) m_oLUI.CommitRename();
     CIviFgenPropImp& props = Props();
     auto& channels = *props.Channels();
     if (lstChans->count() == 0 || channels.Count() == 0) return;
@@ -520,7 +517,6 @@ void PChannels::Validate(std::int32_t index, std::string& text, bool& cancel) {
         Link().AlertChanges();
     }
     Changed(true);
-    m_bRenameEnded = true;
 }
 
 void PChannels::CheckBoxClicked() {

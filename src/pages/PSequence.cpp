@@ -31,7 +31,7 @@ T* Made(T* control, const char* name, const QString& tip = {}) {
 
 } // namespace
 
-PSequence::PSequence(QWidget* parent) : PropertyPage(tr("Sequences"), parent) {
+PSequence::PSequence(QWidget* parent) : NamedListPage(tr("Sequences"), parent) {
     lstSequence = Made(new QListWidget(this), "lstSequence", tr("Selects a sequence."));
     lblSequence = Made(new QLabel(tr("Sequences:"), this), "lblSequence");
     lblSequence->setBuddy(lstSequence);
@@ -87,58 +87,11 @@ PSequence::PSequence(QWidget* parent) : PropertyPage(tr("Sequences"), parent) {
 
 void PSequence::ConnectEvents() {
     auto& lui = m_oLUI;
-    m_vEvents.push_back(lui.BeforeAdd.Connect([this](std::string&) {
-        if (Loading()) return;
-        Handled([&] {
-            if (lstSequence->count() > 0) SaveSequence(m_lCurrent);
-            m_oLUI.ClearLV();
-        });
-    }));
-    m_vEvents.push_back(lui.ItemAdded.Connect([this](std::int32_t index) {
-        if (Loading()) return;
-        Handled([&] {
-            Changed(true);
-            Props().Sequences()->Add(lstSequence->item(index)->text().toStdString());
-            Link().AlertChanges(); // the channels page offers it at once
-            m_lCurrent = m_lRemembered = index;
-            EnableControls(true);
-        });
-    }));
-    m_vEvents.push_back(lui.BeforeRemove.Connect([this](std::int32_t) { m_bRemoving = true; }));
-    m_vEvents.push_back(lui.ItemRemoved.Connect([this](std::int32_t index) {
-        if (!Loading())
-            Handled([&] {
-                Changed(true);
-                Props().Sequences()->Remove(index + 1);
-                m_lCurrent = m_lRemembered = std::max(0, lstSequence->currentRow());
-                EnableControls(true);
-                if (lstSequence->count() > 0) ShowSequence();
-                Link().AlertChanges();
-            });
-        m_bRemoving = false;
-    }));
-    m_vEvents.push_back(lui.ListItemSelected.Connect([this](std::int32_t& index) {
-        const int left = m_lCurrent;
-        m_lCurrent = index;
-        if (Loading()) return;
-        Handled([&] {
-            if (index >= 0 && index < Props().Sequences()->Count()) {
-                // The table goes into the sequence left behind, not into the one selected.
-                if (!m_bRemoving && left != index) SaveSequence(left);
-                ShowSequence();
-            }
-            m_lRemembered = index;
-        });
-    }));
-    m_vEvents.push_back(
-        lui.Validate.Connect([this](std::int32_t& index, std::string& text, bool& cancel) {
-            Handled([&] { Validate(index, text, cancel); });
-        }));
-
+    WireList(lui, lstSequence);
     m_vEvents.push_back(lui.LVListItemSelected.Connect([this](std::int32_t row) {
         if (Loading()) return;
         Handled([&] {
-            if (const auto sequence = SequenceAt(lstSequence->currentRow()))
+            if (const auto sequence = EntryAt(lstSequence->currentRow()))
                 sequence->CurrentItem(row);
         });
     }));
@@ -160,12 +113,8 @@ void PSequence::ConnectEvents() {
         connect(box, &QLineEdit::textChanged, this, [this] { UserChanged(); });
 }
 
-std::shared_ptr<QZIviFgenSequence> PSequence::SequenceAt(int index) {
-    const QListWidgetItem* entry = lstSequence->item(index);
-    if (!entry) return nullptr;
-    auto& sequences = *Props().Sequences();
-    const std::int32_t position = sequences.IndexOfName(entry->text().toStdString());
-    return position == -1 ? nullptr : sequences.Item(position);
+QZIviFgenSequences& PSequence::Entries() {
+    return *Props().Sequences();
 }
 
 void PSequence::Load() {
@@ -185,20 +134,20 @@ void PSequence::Load() {
         for (const auto& sequence : sequences)
             m_oLUI.Add(sequence->Name());
         if (lstSequence->count() > 0) {
-            m_lCurrent = std::clamp(m_lRemembered, 0, lstSequence->count() - 1);
+            m_lCurrent = RememberedEntry();
             lstSequence->setCurrentRow(m_lCurrent);
-            ShowSequence();
+            ShowEntry();
         } else {
             m_oLUI.ClearLV();
         }
     }
-    EnableControls(on);
+    EnableEntries(on);
 }
 
-void PSequence::ShowSequence() {
+void PSequence::ShowEntry() {
     WhileLoading([&] {
         m_oLUI.ClearLV();
-        const auto sequence = SequenceAt(lstSequence->currentRow());
+        const auto sequence = EntryAt(lstSequence->currentRow());
         if (!sequence) return;
         for (const auto& item : *sequence) {
             if (!item->Waveform()) {
@@ -213,8 +162,8 @@ void PSequence::ShowSequence() {
 
 // The items of the sequence of entry `index`, made anew from the table's rows. A row whose name no
 // waveform has any more is dropped.
-void PSequence::SaveSequence(int index) {
-    const auto sequence = SequenceAt(index);
+void PSequence::SaveEntry(int index) {
+    const auto sequence = EntryAt(index);
     if (!sequence) return;
     for (std::int32_t i = sequence->Count(); i >= 1; --i)
         sequence->Remove(i);
@@ -230,11 +179,10 @@ void PSequence::SaveSequence(int index) {
 }
 
 void PSequence::Save() {
-    if (lstSequence->count() > 0) SaveSequence(m_lCurrent);
+    if (lstSequence->count() > 0) SaveEntry(m_lCurrent);
 }
 
 void PSequence::Apply() {
-    m_bAppliedByRename = false;
     m_oLUI.CommitRename();
     m_oLUI.CommitCellEdit();
     Handled([&] { Save(); });
@@ -242,20 +190,12 @@ void PSequence::Apply() {
     Link().ApplyChanges(true);
 }
 
-void PSequence::Validate(std::int32_t index, std::string& text, bool& cancel) {
-    auto& sequences = *Props().Sequences();
-    if (cancel || RenameRefused(text, sequences.IndexOfName(text))) {
-        cancel = true;
-    } else {
-        sequences.Item(index + 1)->Name(text);
-        Link().AlertChanges();
-    }
-    Changed(true);
-    m_bAppliedByRename = true;
-}
-
 // A waveform cell takes only a waveform's exact name; an iteration cell a whole number from 1,
 // rounded from what the text starts with.
+void PSequence::BeforeAddEntry() {
+    m_oLUI.ClearLV();
+}
+
 void PSequence::ValidateCell(std::int32_t column, std::string& text, bool& cancel) {
     if (column == 0) {
         if (Props().Waveforms()->IndexOfName(text) == -1) cancel = true;
@@ -267,10 +207,9 @@ void PSequence::ValidateCell(std::int32_t column, std::string& text, bool& cance
             cancel = true;
     }
     Changed(true);
-    m_bAppliedByRename = true;
 }
 
-void PSequence::EnableControls(bool on) {
+void PSequence::EnableEntries(bool on) {
     const bool wasOpen = lstvWfmItems->isEnabled();
     const bool table = on && lstSequence->count() > 0;
     m_oLUI.Enabled(on);

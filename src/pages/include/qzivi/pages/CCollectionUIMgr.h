@@ -6,6 +6,7 @@
 
 #include "qzivi/support/event.h"
 
+#include <QKeyEvent>
 #include <QObject>
 
 #include <cstdint>
@@ -56,6 +57,11 @@ public:
 
 protected:
     bool eventFilter(QObject* watched, QEvent* event) override;
+    // How an event on an edit box in place ends the edit: Return or Enter keep, Escape cancels
+    // (both keys are consumed), leaving the box keeps. Calls `end(cancel)` and returns whether
+    // the event is consumed.
+    template <typename End>
+    static bool EndsEdit(QEvent* event, End&& end);
 
 private:
     void UserAdd(std::string name);
@@ -85,5 +91,18 @@ private:
     bool m_bRenaming = false;
     QMetaObject::Connection m_cAdd, m_cRemove, m_cItemChanged;
 };
+
+template <typename End>
+bool CCollectionUIMgr::EndsEdit(QEvent* event, End&& end) {
+    if (event->type() == QEvent::FocusOut) {
+        end(false);
+        return false;
+    }
+    if (event->type() != QEvent::KeyPress) return false;
+    const int key = static_cast<QKeyEvent*>(event)->key();
+    if (key != Qt::Key_Return && key != Qt::Key_Enter && key != Qt::Key_Escape) return false;
+    end(key == Qt::Key_Escape);
+    return true;
+}
 
 } // namespace qzivi

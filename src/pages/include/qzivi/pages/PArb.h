@@ -6,10 +6,7 @@
 
 #include "qzivi/model/Waveforms.h"
 #include "qzivi/pages/CCollectionUIMgr.h"
-#include "qzivi/pages/PropertyPage.h"
-
-#include <memory>
-#include <vector>
+#include "qzivi/pages/NamedListPage.h"
 
 class QCheckBox;
 class QComboBox;
@@ -23,7 +20,7 @@ namespace qzivi {
 
 class QZGraph;
 
-class PArb : public PropertyPage {
+class PArb : public NamedListPage<QZIviFgenArbWaveforms> {
     Q_OBJECT
 
 public:
@@ -50,22 +47,16 @@ protected:
     QWidget* FirstControl() override;
 
 private:
-    std::shared_ptr<QZIviFgenArbWaveform> WaveformAt(int index);
+    QZIviFgenArbWaveforms& Entries() override;
+    void SaveEntry(int index) override;
+    void ShowEntry() override;
+    void EnableEntries(bool on) override;
     Points PointsOfFields(QZIviFgenArbWaveform* model);
-    void ShowWaveform();
-    void SaveFields(int index);
-    void EnableFields(bool on);
     void ClearFields();
     void Browse();
     void Preview();
-    void Validate(std::int32_t index, std::string& text, bool& cancel);
 
     CCollectionUIMgr m_oLUI;
-    std::vector<Connection> m_vEvents;
-    bool m_bRemoving = false;
-    bool m_bAppliedByRename = false;
-    int m_lCurrent = 0;
-    int m_lRemembered = 0;
 };
 
 } // namespace qzivi

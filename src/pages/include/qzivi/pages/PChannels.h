@@ -75,7 +75,6 @@ private:
     QStackedLayout* m_oFrames = nullptr;
     bool m_bUpdating = false;
     bool m_bRemoving = false;
-    bool m_bRenameEnded = false;
     bool m_bEnabling = false;
     std::int32_t m_lSelected = 0;
     int m_lTab = 1;

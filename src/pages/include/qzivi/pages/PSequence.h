@@ -3,8 +3,9 @@
 // the sequence are made anew from it whenever the page saves.
 #pragma once
 
+#include "qzivi/model/Sequences.h"
 #include "qzivi/pages/CIviFgenSeqPageImp.h"
-#include "qzivi/pages/PropertyPage.h"
+#include "qzivi/pages/NamedListPage.h"
 
 #include <memory>
 #include <vector>
@@ -17,9 +18,7 @@ class QTreeWidget;
 
 namespace qzivi {
 
-class QZIviFgenSequence;
-
-class PSequence : public PropertyPage {
+class PSequence : public NamedListPage<QZIviFgenSequences> {
     Q_OBJECT
 
 public:
@@ -39,20 +38,16 @@ protected:
     QWidget* FirstControl() override;
 
 private:
+    QZIviFgenSequences& Entries() override;
+    void SaveEntry(int index) override;
+    void ShowEntry() override;
+    void EnableEntries(bool on) override;
+    void BeforeAddEntry() override;
     void ConnectEvents();
-    std::shared_ptr<QZIviFgenSequence> SequenceAt(int index);
-    void ShowSequence();
-    void SaveSequence(int index);
-    void EnableControls(bool on);
     void ValidateCell(std::int32_t column, std::string& text, bool& cancel);
-    void Validate(std::int32_t index, std::string& text, bool& cancel);
 
     CIviFgenSeqPageImp m_oLUI;
     std::vector<Connection> m_vEvents;
-    bool m_bRemoving = false;
-    bool m_bAppliedByRename = false;
-    int m_lCurrent = 0;
-    int m_lRemembered = 0;
 };
 
 } // namespace qzivi
