@@ -24,3 +24,10 @@ c++ "$source/examples/headless/main.cpp" $(pkg-config --cflags --libs qzivifgen)
 cmp "$work/from-find-package.qzc" "$work/from-pkg-config.qzc"
 # The installed command line reads what the example wrote.
 "$prefix/bin/qzfgen" configure "$work/from-pkg-config.qzc"
+# The Python module, where it was built, imports from the install.
+module_dir=$prefix/lib/python3/dist-packages
+if ls "$module_dir"/qzivifgen*.so >/dev/null 2>&1; then
+  PYTHONPATH=$module_dir /usr/bin/python3 -c \
+    "import qzivifgen as q; f = q.QZIviFgen(); f.Channels.Add('Channel1'); f.Init(); f.Configure(); print('python:', f.Channels[0].Name)"
+  [ -f "$module_dir/qzivifgen.pyi" ]
+fi
