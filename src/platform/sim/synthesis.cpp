@@ -138,13 +138,18 @@ std::vector<double> AcceptedTriggers(const OutputState& out,
 }
 
 double Sample(const OutputState& out, double t, const std::vector<double>& triggers) {
+    double period = 0;
+    Carrier(out, 0, &period);
+    return Sample(out, t, triggers, period);
+}
+
+double Sample(const OutputState& out, double t, const std::vector<double>& triggers,
+              double period) {
     const ChannelState& s = out.channel;
     const GlobalState& g = out.global;
     if (!out.generating || !s.outputEnabled) return 0;
     const double idle = g.outputMode == IVIFGEN_VAL_OUTPUT_FUNC ? s.func.offset : s.arbOffset;
     double tau = t;
-    double period = 0;
-    Carrier(out, 0, &period);
     if (s.operationMode == IVIFGEN_VAL_OPERATE_BURST) {
         const double burst = period * s.burstCount;
         double start = -1;
@@ -172,8 +177,10 @@ double Sample(const OutputState& out, double t, const std::vector<double>& trigg
 void Render(const OutputState& out, const std::vector<double>& softwareTriggers, double startTime,
             double timeStep, ViInt32 count, double* volts) {
     const std::vector<double> triggers = AcceptedTriggers(out, softwareTriggers);
+    double period = 0; // the same for every sample: found once
+    Carrier(out, 0, &period);
     for (ViInt32 k = 0; k < count; ++k)
-        volts[k] = Sample(out, startTime + k * timeStep, triggers);
+        volts[k] = Sample(out, startTime + k * timeStep, triggers, period);
 }
 
 } // namespace qzivi::sim
