@@ -42,7 +42,7 @@ class File {
 public:
     explicit File(const std::string& name) {
         if (name.empty()) NotAccessible();
-        fd_ = ::open(name.c_str(), O_RDONLY | O_CLOEXEC);
+        fd_ = ::open(name.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC); // a FIFO must not block
         struct stat info {};
         if (fd_ < 0 || ::fstat(fd_, &info) != 0 || !S_ISREG(info.st_mode)) {
             if (fd_ >= 0) ::close(fd_);

@@ -96,8 +96,11 @@ void CPropBagFile::LoadPropBagFile(const std::string& path, const std::string& i
     struct stat info {};
     if (path.empty() || ::stat(path.c_str(), &info) != 0) return;
     Fd file;
-    file.fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+    file.fd = ::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC); // a FIFO must not block
     if (file.fd < 0) FileFailure(kLoad, path, "cannot be opened");
+    if (::fstat(file.fd, &info) != 0 || !S_ISREG(info.st_mode))
+        RaiseRuntime(runtime::kFileAccess,
+                     "The configuration file \"" + path + "\" is no regular file.", kLoad);
     const auto length = static_cast<std::uint64_t>(info.st_size);
 
     std::string head(identifier.size(), '\0');

@@ -1,7 +1,10 @@
 // A whole tree through the bag and through Clone: channels, waveforms of every source, sequences
 // and internal settings come back equal, with references resolved by index.
+#include "qzivi/driver/ErrorIds.h"
 #include "qzivi/model/PropertyBag.h"
 #include "tree_fixture.h"
+
+#include <sys/stat.h>
 
 namespace qzivi {
 namespace {
@@ -138,6 +141,21 @@ TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
         EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(partial, "", true); }),
                   runtime::kImproperFile)
             << size;
+    }
+}
+
+// A FIFO or a folder where a file is expected is refused at once: reading it must neither block
+// nor pass for an empty file.
+TEST_F(PersistenceTest, AFifoOrAFolderIsNoConfigurationAndNoDataFile) {
+    const std::string fifo = (dir_ / "fifo").string();
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0644), 0);
+    std::filesystem::create_directory(dir_ / "folder");
+    for (const std::string& path : {fifo, (dir_ / "folder").string()}) {
+        EXPECT_EQ(Raised([&] { tree_->Configurations()->Add("file", path); }), errid::kFileAccess)
+            << path;
+        const auto waveform = tree_->Waveforms()->Add("", qzivifgenASCIIFile, path);
+        // The readers give no points for what is no file, as for a file without any.
+        EXPECT_EQ(waveform->GetDataSample(0, 1, -1), nullptr) << path;
     }
 }
 

@@ -1,12 +1,14 @@
 // The configuration store: its text, its search order, and its refusals.
 #include "qzivi/config_store.h"
 #include "qzivi/ivi_common.h"
+#include "qzivi/trace.h"
 #include "test_support.h"
 
 #include <gmock/gmock.h>
 
 #include <filesystem>
 #include <fstream>
+#include <sys/stat.h>
 
 using qzivi::ivi::ConfigStore;
 using qzivi::ivi::EditableConfigStoreFile;
@@ -156,4 +158,28 @@ TEST(ConfigStoreFile, TheEditableStoreIsTheOneInUseOrANewCommentedOne) {
 
     const std::string named = scope.UseStore("[Bench]\nmodule = builtin\n");
     EXPECT_EQ(EditableConfigStoreFile(), named);
+}
+
+// A FIFO or a folder named as the store, or as the trace file, is refused at once: none of them
+// may block the caller or read as an empty store.
+TEST(ConfigStoreSearch, AStoreOrTraceThatIsNoFileIsRefusedAtOnce) {
+    StoreScope scope;
+    const std::string fifo = (scope.Dir() / "fifo").string();
+    ASSERT_EQ(::mkfifo(fifo.c_str(), 0644), 0);
+    std::filesystem::create_directory(scope.Dir() / "folder");
+    for (const std::string& path : {fifo, (scope.Dir() / "folder").string()}) {
+        ::setenv("QZIVI_CONFIG_STORE", path.c_str(), 1);
+        ViSession vi = 0;
+        EXPECT_EQ(IviFgen_InitWithOptions("SampleFGen", VI_FALSE, VI_FALSE, "", &vi),
+                  IVI_ERROR_CANNOT_OPEN_FILE);
+        EXPECT_THAT(LastError(VI_NULL), HasSubstr("is no regular file"));
+    }
+    ::unsetenv("QZIVI_CONFIG_STORE");
+    ::setenv("QZIVI_TRACE", fifo.c_str(), 1);
+    ViSession vi = 0;
+    EXPECT_EQ(IviFgen_InitWithOptions("SampleFGen", VI_FALSE, VI_FALSE, "", &vi),
+              IVI_ERROR_CANNOT_OPEN_FILE);
+    EXPECT_THAT(LastError(VI_NULL), HasSubstr("a pipe that nobody reads"));
+    ::unsetenv("QZIVI_TRACE");
+    qzivi::ivi::SetTraceFile("");
 }

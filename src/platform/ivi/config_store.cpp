@@ -5,10 +5,12 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <fcntl.h>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace qzivi::ivi {
 
@@ -164,15 +166,35 @@ std::string EditableConfigStoreFile() {
 ConfigStore LoadConfigStore() {
     const std::string path = FindConfigStoreFile();
     if (path.empty()) return ParseConfigStore("", "");
-    std::ifstream file(path, std::ios::binary);
-    if (!file)
+    // Opened without waiting and read only if it is a plain file: a FIFO would block the
+    // caller for good, and a folder would read as an empty store.
+    const int fd = ::open(path.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+    if (fd < 0)
         throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
                           "configuration store \"" + path +
                               "\" cannot be read: " + std::strerror(errno));
+    struct stat info {};
+    if (::fstat(fd, &info) != 0 || !S_ISREG(info.st_mode)) {
+        ::close(fd);
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                          "configuration store \"" + path + "\" is no regular file");
+    }
+    std::string text;
+    char block[4096];
+    for (ssize_t got; (got = ::read(fd, block, sizeof block)) != 0;) {
+        if (got < 0) {
+            if (errno == EINTR) continue;
+            const int error = errno;
+            ::close(fd);
+            throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                              "configuration store \"" + path +
+                                  "\" cannot be read: " + std::strerror(error));
+        }
+        text.append(block, static_cast<std::size_t>(got));
+    }
+    ::close(fd);
     RefuseIfWritableByOthers(path, "configuration store");
-    std::ostringstream text;
-    text << file.rdbuf();
-    return ParseConfigStore(text.str(), path);
+    return ParseConfigStore(text, path);
 }
 
 } // namespace qzivi::ivi

@@ -2,11 +2,15 @@
 
 #include "qzivi/ivi_common.h"
 
+#include <cerrno>
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
-#include <fstream>
 #include <mutex>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace qzivi::ivi {
 
@@ -17,11 +21,32 @@ std::atomic<bool> g_traceOn{false};
 namespace {
 std::mutex g_mutex;
 TraceSink g_sink;
-std::ofstream g_file;
+std::FILE* g_file = nullptr;
 std::string g_filePath;
 
 void UpdateSwitch() {
-    detail::g_traceOn.store(g_sink != nullptr || g_file.is_open());
+    detail::g_traceOn.store(g_sink != nullptr || g_file != nullptr);
+}
+
+// Opened for appending without waiting: a FIFO with no reader is refused at once, not waited
+// for; one with a reader (a terminal, a pipe as /dev/stdout) is written to as any file.
+std::FILE* OpenForAppending(const std::string& path) {
+    const int fd =
+        ::open(path.c_str(), O_WRONLY | O_APPEND | O_CREAT | O_NONBLOCK | O_CLOEXEC, 0644);
+    if (fd < 0)
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                          "the trace file \"" + path + "\" cannot be opened for writing: " +
+                              (errno == ENXIO ? "a pipe that nobody reads" : std::strerror(errno)));
+    struct stat info {};
+    if (::fstat(fd, &info) != 0 || S_ISDIR(info.st_mode)) {
+        ::close(fd);
+        throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
+                          "the trace file \"" + path + "\" is a folder");
+    }
+    ::fcntl(fd, F_SETFL, ::fcntl(fd, F_GETFL) & ~O_NONBLOCK); // writes wait as usual
+    std::FILE* file = ::fdopen(fd, "a");
+    if (!file) ::close(fd);
+    return file;
 }
 } // namespace
 
@@ -111,10 +136,16 @@ TraceSink SetTraceSink(TraceSink sink) {
 void SetTraceFile(const std::string& path) {
     std::lock_guard lock(g_mutex);
     if (path == g_filePath) return;
-    g_file.close();
+    if (g_file) std::fclose(g_file);
+    g_file = nullptr;
     g_filePath.clear();
     if (!path.empty()) {
-        g_file.open(path, std::ios::app);
+        try {
+            g_file = OpenForAppending(path);
+        } catch (...) {
+            UpdateSwitch();
+            throw;
+        }
         if (!g_file) {
             UpdateSwitch();
             throw StatusError(IVI_ERROR_CANNOT_OPEN_FILE,
@@ -132,7 +163,11 @@ std::string TraceFile() {
 
 void Trace(const TraceRecord& record) {
     std::lock_guard lock(g_mutex);
-    if (g_file.is_open()) g_file << record.Line() << '\n' << std::flush;
+    if (g_file) {
+        const std::string line = record.Line() + '\n';
+        std::fwrite(line.data(), 1, line.size(), g_file);
+        std::fflush(g_file);
+    }
     if (g_sink) g_sink(record);
 }
 
