@@ -183,3 +183,26 @@ TEST(ConfigStoreSearch, AStoreOrTraceThatIsNoFileIsRefusedAtOnce) {
     ::unsetenv("QZIVI_TRACE");
     qzivi::ivi::SetTraceFile("");
 }
+
+TEST(ConfigStoreText, AByteOrderMarkIsNoTextAndANulByteIsRefused) {
+    const ConfigStore store =
+        ParseConfigStore("\xEF\xBB\xBF[Bench]\nmodule = builtin\n", "bom.conf");
+    EXPECT_NE(store.Find("Bench"), nullptr);
+    try {
+        ParseConfigStore(std::string("[Be\0nch]\nmodule = builtin\n", 26), "nul.conf");
+        FAIL() << "a NUL byte was taken into a name";
+    } catch (const qzivi::ivi::StatusError& e) {
+        EXPECT_THAT(e.what(), HasSubstr("nul.conf, line 1: a NUL byte stands in the line"));
+    }
+}
+
+TEST(ConfigStoreSearch, AHugeLogicalNameIsToldByItsStart) {
+    StoreScope scope;
+    const std::string name(10'000'000, 'x');
+    ViSession vi = 0;
+    EXPECT_EQ(IviFgen_InitWithOptions(name.c_str(), VI_FALSE, VI_FALSE, "", &vi),
+              IVI_ERROR_LOGICAL_NAME_NOT_FOUND);
+    const std::string why = LastError(VI_NULL);
+    EXPECT_LT(why.size(), 1000u);
+    EXPECT_THAT(why, HasSubstr(std::string(80, 'x') + "...\" is not in the configuration store"));
+}

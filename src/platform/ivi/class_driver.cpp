@@ -85,8 +85,11 @@ const DriverSession& FindEntry(const ConfigStore& store, const std::string& name
     std::string known;
     for (const auto& session : store.sessions)
         known += (known.empty() ? "" : ", ") + session.logicalName;
+    // A name of any length is told by its start: an error text is for a person to read.
+    constexpr std::size_t kShown = 80;
+    const std::string shown = name.size() <= kShown ? name : name.substr(0, kShown) + "...";
     throw StatusError(IVI_ERROR_LOGICAL_NAME_NOT_FOUND,
-                      "logical name \"" + name + "\" is not in the configuration store " +
+                      "logical name \"" + shown + "\" is not in the configuration store " +
                           (store.path.empty() ? std::string("(embedded default only)")
                                               : "\"" + store.path + "\"") +
                           "; known names: " + known);

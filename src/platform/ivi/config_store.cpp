@@ -48,10 +48,13 @@ ConfigStore ParseConfigStore(std::string_view text, const std::string& path) {
                           "configuration store " + (path.empty() ? std::string("text") : path) +
                               ", line " + std::to_string(lineNumber) + ": " + why);
     };
+    // An editor's byte-order mark is no part of the first line.
+    if (text.starts_with("\xEF\xBB\xBF")) text.remove_prefix(3);
     std::istringstream lines{std::string(text)};
     std::string raw;
     while (std::getline(lines, raw)) {
         ++lineNumber;
+        if (raw.find('\0') != std::string::npos) fail("a NUL byte stands in the line");
         const std::string_view line = Trim(raw);
         if (line.empty() || line.front() == '#' || line.front() == ';') continue;
         if (line.front() == '[') {
