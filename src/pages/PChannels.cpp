@@ -449,16 +449,15 @@ void PChannels::Enabling(bool on) {
     const Hold enabling(m_bEnabling);
     const Hold updating(m_bUpdating);
     if (!on) ClearFields();
-    for (int i = 0; i < kFields; ++i)
-        for (QWidget* w : {static_cast<QWidget*>(txtChan[i]), static_cast<QWidget*>(cmbChannel[i]),
-                           static_cast<QWidget*>(chkChan[i]), static_cast<QWidget*>(lblChan[i])})
-            if (w) w->setEnabled(on);
-    const std::int32_t ext = Props().Extensions();
+    // The field of index i and its label.
     const auto open = [&](int i, bool state) {
         for (QWidget* w : {static_cast<QWidget*>(txtChan[i]), static_cast<QWidget*>(cmbChannel[i]),
                            static_cast<QWidget*>(chkChan[i]), static_cast<QWidget*>(lblChan[i])})
             if (w) w->setEnabled(state);
     };
+    for (int i = 0; i < kFields; ++i)
+        open(i, on);
+    const std::int32_t ext = Props().Extensions();
     open(9, on && (ext & qzivifgenBurstExt));
     open(8, on && (ext & qzivifgenTriggerExt));
     open(10, on && (ext & qzivifgenModulateAMExt));
