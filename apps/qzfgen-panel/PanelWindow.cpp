@@ -122,25 +122,28 @@ qzivi::QZIviFgen& PanelWindow::Control() {
     return m_oForm->Control();
 }
 
+// A dialog for .qzc files, starting at the file open now.
+qzivi::CCommonDialog PanelWindow::FileDialog(const QString& title, int flags) const {
+    qzivi::CCommonDialog dialog;
+    dialog.DialogTitle = title;
+    dialog.Filter = "QZ IVI Configurations (*.qzc)|*.qzc|All files|*.*";
+    dialog.DefaultExt = "qzc";
+    dialog.Flags = flags;
+    dialog.FileName = m_sFile;
+    return dialog;
+}
+
 void PanelWindow::BuildMenus() {
     QMenu* file = menuBar()->addMenu(tr("&File"));
     file->addAction(tr("&Open…"), QKeySequence::Open, this, [this] {
-        qzivi::CCommonDialog dialog;
-        dialog.DialogTitle = tr("Open a configuration");
-        dialog.Filter = "QZ IVI Configurations (*.qzc)|*.qzc|All files|*.*";
-        dialog.DefaultExt = "qzc";
-        dialog.Flags = qzivi::CCommonDialog::cdlOFNFileMustExist;
-        dialog.FileName = m_sFile;
+        auto dialog =
+            FileDialog(tr("Open a configuration"), qzivi::CCommonDialog::cdlOFNFileMustExist);
         if (dialog.ShowOpen(this)) OpenFile(dialog.FileName);
     });
     m_oRecent = file->addMenu(tr("Open &Recent"));
     file->addAction(tr("&Save As…"), QKeySequence::SaveAs, this, [this] {
-        qzivi::CCommonDialog dialog;
-        dialog.DialogTitle = tr("Save the configuration as");
-        dialog.Filter = "QZ IVI Configurations (*.qzc)|*.qzc";
-        dialog.DefaultExt = "qzc";
-        dialog.Flags = qzivi::CCommonDialog::cdlOFNOverwritePrompt;
-        dialog.FileName = m_sFile;
+        auto dialog = FileDialog(tr("Save the configuration as"),
+                                 qzivi::CCommonDialog::cdlOFNOverwritePrompt);
         if (dialog.ShowSave(this)) SaveFile(dialog.FileName);
     });
     file->addSeparator();

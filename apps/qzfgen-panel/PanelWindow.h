@@ -6,6 +6,8 @@
 
 #include "ScopeView.h"
 
+#include "qzivi/panels/CCommonDialog.h"
+
 #include <QElapsedTimer>
 #include <QMainWindow>
 #include <QTimer>
@@ -54,6 +56,7 @@ protected:
 
 private:
     void BuildMenus();
+    qzivi::CCommonDialog FileDialog(const QString& title, int flags) const;
     void Note(const QString& text);
     void Remember(const QString& path);
     void FillRecent();
