@@ -182,7 +182,10 @@ void QZIviFgenArbWaveform::ReadProperties(const PropertyBag& bag, const std::str
     UniqueId(NewUniqueId());
     if (m_lSource != 0) return;
     const std::int32_t byteSize = bag.ReadInt32(p + "ByteSize", 0);
-    if (byteSize <= 0) return;
+    if (byteSize <= 0) { // points claimed as got, but none held: none got, so it saves again
+        m_bDataGotOnce = false;
+        return;
+    }
     if (byteSize % static_cast<std::int32_t>(sizeof(double)) != 0)
         RaiseRuntime(runtime::kImproperFile, "The waveform \"" + m_sName + "\" claims " +
                                                  std::to_string(byteSize) +

@@ -159,5 +159,20 @@ TEST_F(PersistenceTest, AFifoOrAFolderIsNoConfigurationAndNoDataFile) {
     }
 }
 
+// What loads must save again: a held waveform that claims its points were got but holds none.
+TEST_F(PersistenceTest, AHeldWaveformWithoutPointsLoadsAndSavesAgain) {
+    PropertyBag bag;
+    bag.WriteInt32("Waveforms_ItemCount", 1, 0);
+    bag.WriteText("Waveforms_Item1_Waveform_Name", "Empty", "");
+    bag.WriteInt32("Waveforms_Item1_Waveform_Source", 0, 1);
+    bag.WriteBool("Waveforms_Item1_Waveform_DataGotOnce", true, false);
+    auto tree = NewTree();
+    ASSERT_EQ(Raised([&] { tree->ReadProperties(bag, "", true); }), 0);
+    PropertyBag again;
+    EXPECT_EQ(Raised([&] { tree->WriteProperties(again, "", true); }), 0);
+    EXPECT_TRUE(codes_.empty());
+    EXPECT_FALSE(tree->Waveforms()->Item(1)->DataGotOnce());
+}
+
 } // namespace
 } // namespace qzivi
