@@ -442,7 +442,9 @@ void QZIviFgenSequences::RemoveItemsOf(const QZIviFgenArbWaveform& waveform) {
 }
 
 void QZIviFgenSequences::WaveformRenamed(const std::string& now, const std::string& before) {
-    if (now.empty()) return; // a rename to nothing is not followed
+    // A rename to nothing is not followed; nor one to the same name, which would rename the
+    // twins to their own name, and so on without end.
+    if (now.empty() || now == before) return;
     const auto propSet = PropSet();
     std::vector<const QZIviFgenArbWaveform*> named = ForeignNamed(before, false);
     if (propSet)

@@ -102,8 +102,7 @@ std::vector<double> AcceptedTriggers(const OutputState& out,
 // The output at `t` seconds after generation started, given the accepted triggers.
 double Sample(const OutputState& out, double t, const std::vector<double>& triggers);
 // The same with the carrier's period given, as Render finds it once for all its samples.
-double Sample(const OutputState& out, double t, const std::vector<double>& triggers,
-              double period);
+double Sample(const OutputState& out, double t, const std::vector<double>& triggers, double period);
 // `count` samples from `startTime`, `timeStep` apart.
 void Render(const OutputState& out, const std::vector<double>& softwareTriggers, double startTime,
             double timeStep, ViInt32 count, double* volts);
