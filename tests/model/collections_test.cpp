@@ -402,5 +402,15 @@ TEST_F(SequencesTest, AnItemOfAnotherCopyKeepsItsWaveformWhileTheNameLivesOn) {
     EXPECT_EQ(copiedItem->Waveform(), nullptr) << "no Z in the copy: the reference goes";
 }
 
+// A waveform given its own name again, while a sequence uses it: the twins follow a rename, and
+// a rename to the same name must end at once instead of renaming them without end.
+TEST_F(SequencesTest, AWaveformRenamedToItsOwnNameEndsAtOnce) {
+    const auto waveform = tree_->Waveforms()->Add("Ramp");
+    tree_->Sequences()->Add("Train")->Add(waveform, 2);
+    waveform->Name("Ramp");
+    EXPECT_EQ(tree_->Sequences()->Item(1)->SequenceItem(1)->Waveform(), waveform);
+    EXPECT_EQ(waveform->Name(), "Ramp");
+}
+
 } // namespace
 } // namespace qzivi
