@@ -18,3 +18,6 @@ echo "== address and undefined-behaviour sanitizer build and tests"
 scripts/build.sh build/sanitize -DQZIVI_SANITIZE=ON -DQZIVI_BUILD_BENCH=OFF -DCMAKE_BUILD_TYPE=Debug
 ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1 \
   ctest --test-dir build/sanitize --output-on-failure -j 2
+
+echo "== fuzz targets, a short run each (scripts/fuzz.sh runs them long)"
+scripts/fuzz.sh 2000

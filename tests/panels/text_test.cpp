@@ -42,6 +42,12 @@ TEST(FormatValueWithUnit, GivesTheExamples) {
     }
     EXPECT_DOUBLE_EQ(Format("5 Amp", "A", 2).value, 5e-3) << "a prefix letter inside a word counts";
     EXPECT_DOUBLE_EQ(Format("7 Hz", "Hz", 2).value, 7) << "a typed unit is skipped";
+    // Numbers whose fifteen digits are written with an exponent keep their prefix too, so what
+    // is written reads back (found by the fuzzer: "0.0000513000 aHz" read as 5.13e-05).
+    EXPECT_DOUBLE_EQ(Format("0.00005 m", "V", 2).value, 5e-8);
+    const auto small = Format("0.0000513000 aHz", "Hz", 10);
+    EXPECT_DOUBLE_EQ(small.value, 5.13e-23);
+    EXPECT_DOUBLE_EQ(Format(small.text, "Hz", 10).value, small.value);
 }
 
 TEST(ParseLeadingNumber, ReadsTheNumberAtTheStart) {

@@ -61,8 +61,9 @@ std::string_view NumberToken(std::string_view text) {
     return text.substr(0, i);
 }
 
-double ParseLeadingNumber(std::string_view text) {
-    if (const auto whole = text::ParseNumber(text); whole && std::isfinite(*whole)) return *whole;
+// The leading number's token within `text`: what ParseLeadingNumber reads when the whole text is
+// no number.
+std::string_view LeadingToken(std::string_view text) {
     std::string_view rest;
     for (std::size_t i = 0; i < text.size(); ++i) {
         if (text[i] < '0' || text[i] > '9') continue;
@@ -73,7 +74,12 @@ double ParseLeadingNumber(std::string_view text) {
         rest = joins && IsNumber(text.substr(i - 1, 2)) ? text.substr(i - 1) : text.substr(i);
         break;
     }
-    std::string_view token = NumberToken(rest);
+    return NumberToken(rest);
+}
+
+double ParseLeadingNumber(std::string_view text) {
+    if (const auto whole = text::ParseNumber(text); whole && std::isfinite(*whole)) return *whole;
+    std::string_view token = LeadingToken(text);
     if (token.empty()) return 0;
     const bool negative = token.front() == '-';
     if (token.front() == '+' || negative) token.remove_prefix(1);
@@ -170,6 +176,10 @@ void FormatValueWithUnit(std::string_view input, std::string& text, double& valu
                 break;
             }
         }
+        // A number whose 15 digits are written with an exponent ("5.13e-05") is not found so;
+        // its token is, and a prefix after it counts as after any other number.
+        if (const auto token = LeadingToken(input); end == std::string_view::npos && !token.empty())
+            end = static_cast<std::size_t>(token.data() - input.data()) + token.size() - 1;
         if (end != std::string_view::npos && end + 1 < input.size())
             for (std::size_t i = end; i < input.size() && exponent == 0; ++i)
                 exponent = PrefixExponent(input[i]);
