@@ -1,5 +1,7 @@
 #include "qzivi/pages/CCollectionUIMgr.h"
 
+#include "qzivi/support/scoped_hook.h"
+
 #include <QAbstractButton>
 #include <QKeyEvent>
 #include <QLineEdit>
@@ -10,14 +12,6 @@
 namespace qzivi {
 
 namespace {
-
-// A flag held for the length of a scope.
-struct Hold {
-    explicit Hold(bool& flag) : flag(flag), was(flag) { flag = true; }
-    ~Hold() { flag = was; }
-    bool& flag;
-    bool was;
-};
 
 constexpr int kCheckBoxWidth = 15; // pixels of an entry's check box
 
@@ -82,12 +76,12 @@ void CCollectionUIMgr::Detach() {
 }
 
 void CCollectionUIMgr::Add(const std::string& name) {
-    const Hold silent(m_bSilent);
+    const FlagHold silent(m_bSilent);
     UserAdd(name);
 }
 
 void CCollectionUIMgr::Remove(std::int32_t index) {
-    const Hold silent(m_bSilent);
+    const FlagHold silent(m_bSilent);
     Removal(index);
 }
 
@@ -107,7 +101,7 @@ std::string CCollectionUIMgr::NextFreeName() const {
 }
 
 void CCollectionUIMgr::UserAdd(std::string name) {
-    const Hold busy(m_bBusy);
+    const FlagHold busy(m_bBusy);
     m_oList->setEnabled(true);
     if (!m_bSilent) BeforeAdd(name);
     if (name.empty()) name = NextFreeName();
@@ -123,7 +117,7 @@ void CCollectionUIMgr::UserAdd(std::string name) {
 }
 
 void CCollectionUIMgr::Removal(std::int32_t index) {
-    const Hold busy(m_bBusy);
+    const FlagHold busy(m_bBusy);
     if (!m_bSilent) BeforeRemove(-1);
     if (index == -1) index = m_oList->currentRow();
     if (index < 0 || index >= m_oList->count()) return;
@@ -200,7 +194,7 @@ void CCollectionUIMgr::StartRename() {
 
 void CCollectionUIMgr::EndRename(bool cancel) {
     if (m_bEnding || !m_bRenaming) return;
-    const Hold ending(m_bEnding);
+    const FlagHold ending(m_bEnding);
     m_bRenaming = false;
     std::int32_t index = m_lEditIndex;
     std::string text = m_oEditBox->text().toStdString();

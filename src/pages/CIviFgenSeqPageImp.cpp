@@ -1,5 +1,7 @@
 #include "qzivi/pages/CIviFgenSeqPageImp.h"
 
+#include "qzivi/support/scoped_hook.h"
+
 #include <QAbstractButton>
 #include <QHeaderView>
 #include <QKeyEvent>
@@ -12,13 +14,6 @@
 namespace qzivi {
 
 namespace {
-
-struct Hold {
-    explicit Hold(bool& flag) : flag(flag), was(flag) { flag = true; }
-    ~Hold() { flag = was; }
-    bool& flag;
-    bool was;
-};
 
 void Enable(QAbstractButton* button, bool on) {
     if (button) button->setEnabled(on);
@@ -102,7 +97,7 @@ void CIviFgenSeqPageImp::SetLVHeaderInfo(const std::vector<std::string>& headers
 }
 
 void CIviFgenSeqPageImp::AddLVI(std::vector<std::string> values) {
-    const Hold silent(m_bSilent);
+    const FlagHold silent(m_bSilent);
     m_vPending = std::move(values);
     AddRow();
 }
@@ -148,7 +143,7 @@ void CIviFgenSeqPageImp::RemoveRow() {
 
 void CIviFgenSeqPageImp::ClearLV() {
     if (!m_oTable || !Enabled()) return;
-    const Hold silent(m_bSilent);
+    const FlagHold silent(m_bSilent);
     while (m_oTable->topLevelItemCount() > 0)
         RemoveRow();
 }
@@ -275,7 +270,7 @@ void CIviFgenSeqPageImp::StartCellEdit() {
 
 void CIviFgenSeqPageImp::EndCellEdit(bool cancel) {
     if (m_bEnding || !m_bEditing) return;
-    const Hold ending(m_bEnding);
+    const FlagHold ending(m_bEnding);
     m_bEditing = false;
     std::string text = m_oCellEdit->text().toStdString();
     if (m_oTable->topLevelItemCount() > 0 && m_oTable->isEnabled()) {

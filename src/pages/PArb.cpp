@@ -29,13 +29,6 @@ namespace qzivi {
 
 namespace {
 
-template <typename T>
-T* Made(T* control, const char* name, const QString& tip = {}) {
-    control->setObjectName(name);
-    if (!tip.isEmpty()) control->setToolTip(tip);
-    return control;
-}
-
 // The file's own failure before the readers see it: they take a missing file or a directory for a
 // file without points.
 void CheckFile(const std::string& path) {

@@ -1,5 +1,7 @@
 #include "qzivi/pages/PChannels.h"
 
+#include "qzivi/support/scoped_hook.h"
+
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/model/Channels.h"
 #include "qzivi/model/QZIviFgenEnum.h"
@@ -128,14 +130,6 @@ const ListField kLists[] = {
 
 constexpr std::int32_t kOutputModeExtensions =
     qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt;
-
-// A flag held for the length of a scope.
-struct Hold {
-    explicit Hold(bool& flag) : flag(flag), was(flag) { flag = true; }
-    ~Hold() { flag = was; }
-    bool& flag;
-    bool was;
-};
 
 } // namespace
 
@@ -316,7 +310,7 @@ void PChannels::Painting() {
 }
 
 void PChannels::Load() {
-    const Hold updating(m_bUpdating);
+    const FlagHold updating(m_bUpdating);
     ClearFields();
     CIviFgenPropImp& props = Props();
     const QZIviFgenEnum names;
@@ -349,9 +343,9 @@ void PChannels::Show() {
     const auto channel = Selected();
     if (!channel) return;
     const bool refill = m_bUpdating;
-    const Hold updating(m_bUpdating);
+    const FlagHold updating(m_bUpdating);
     Channel& c = *channel;
-    std::optional<Hold> filling(m_bEnabling); // the enabling waits for the whole channel
+    std::optional<FlagHold> filling(m_bEnabling); // the enabling waits for the whole channel
     for (const NumberField& number : kNumbers)
         txtChan[number.index]->setText(QString::fromStdString(text::FormatNumber(number.get(c))));
     for (const ListField& list : kLists) {
@@ -446,8 +440,8 @@ void PChannels::Update(bool on) {
 
 void PChannels::Enabling(bool on) {
     if (m_bEnabling) return; // the lists it clears come back here
-    const Hold enabling(m_bEnabling);
-    const Hold updating(m_bUpdating);
+    const FlagHold enabling(m_bEnabling);
+    const FlagHold updating(m_bUpdating);
     if (!on) ClearFields();
     // The field of index i and its label.
     const auto open = [&](int i, bool state) {
@@ -482,7 +476,7 @@ void PChannels::SwitchFrame(int tab) {
     int frame = tab;
     CIviFgenPropImp& props = Props();
     if (!(props.Extensions() & kOutputModeExtensions)) {
-        const Hold updating(m_bUpdating);
+        const FlagHold updating(m_bUpdating);
         lstChans->clear();
         auto& channels = *props.Channels();
         for (std::int32_t i = channels.Count(); i >= 1; --i)

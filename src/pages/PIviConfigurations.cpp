@@ -33,10 +33,10 @@ CCommonDialog FileDialog(const QString& title, int flags) {
     return dialog;
 }
 
+// Made, with the tip as the accessible name where the control has none of its own.
 template <typename T>
-T* Made(T* control, const char* name, const QString& tip) {
-    control->setObjectName(name);
-    control->setToolTip(tip);
+T* Described(T* control, const char* name, const QString& tip) {
+    Made(control, name, tip);
     if (control->accessibleName().isEmpty()) control->setAccessibleName(tip);
     return control;
 }
@@ -47,28 +47,31 @@ PIviConfigurations::PIviConfigurations(QWidget* parent)
     : PropertyPage(tr("Configurations"), parent) {
     const QString verifyTip =
         tr("Ensures that the current property set is valid for the instrument.");
-    cmdVerifyConfig = Made(new QToolButton(this), "cmdVerifyConfig", verifyTip);
+    cmdVerifyConfig = Described(new QToolButton(this), "cmdVerifyConfig", verifyTip);
     cmdVerifyConfig->setIcon(LoadPictureFromResource(120));
     cmdVerifyConfig->setIconSize(QSize(24, 24));
     auto* frame = new QGroupBox(tr("Configuration sets"), this);
     frame->setObjectName("Frame1");
-    cmdStore = Made(new QPushButton(tr("Store"), frame), "cmdStore",
-                    tr("Stores the current property set into the selected configuration."));
-    txtRename = Made(new QLineEdit(frame), "txtRename", tr("Rename the configuration."));
-    cmdExport = Made(new QToolButton(frame), "cmdExport",
-                     tr("Exports the selected configuration to a file."));
+    cmdStore = Described(new QPushButton(tr("Store"), frame), "cmdStore",
+                         tr("Stores the current property set into the selected configuration."));
+    txtRename = Described(new QLineEdit(frame), "txtRename", tr("Rename the configuration."));
+    cmdExport = Described(new QToolButton(frame), "cmdExport",
+                          tr("Exports the selected configuration to a file."));
     cmdExport->setIcon(LoadPictureFromResource(117));
-    cmdImport = Made(new QToolButton(frame), "cmdImport",
-                     tr("Imports a configuration from a file into the selected configuration."));
+    cmdImport =
+        Described(new QToolButton(frame), "cmdImport",
+                  tr("Imports a configuration from a file into the selected configuration."));
     cmdImport->setIcon(LoadPictureFromResource(118));
-    cmdDefaults = Made(new QPushButton(tr("Set to default"), frame), "cmdDefaults",
-                       tr("Sets all properties to their default values."));
-    cmdDel = Made(new QPushButton(tr("Remove"), frame), "cmdDel", tr("Removes a configuration."));
-    cmdLoad = Made(new QPushButton(tr("Load"), frame), "cmdLoad",
-                   tr("Loads the selected configuration into the current property set."));
-    cmdAdd = Made(new QPushButton(tr("Add"), frame), "cmdAdd", tr("Adds a configuration."));
-    lstConfigs = Made(new QListWidget(frame), "lstConfigs", tr("Selects a configuration."));
-    auto* label = Made(new QLabel(tr("Verify current configuration"), this), "Label1", verifyTip);
+    cmdDefaults = Described(new QPushButton(tr("Set to default"), frame), "cmdDefaults",
+                            tr("Sets all properties to their default values."));
+    cmdDel =
+        Described(new QPushButton(tr("Remove"), frame), "cmdDel", tr("Removes a configuration."));
+    cmdLoad = Described(new QPushButton(tr("Load"), frame), "cmdLoad",
+                        tr("Loads the selected configuration into the current property set."));
+    cmdAdd = Described(new QPushButton(tr("Add"), frame), "cmdAdd", tr("Adds a configuration."));
+    lstConfigs = Described(new QListWidget(frame), "lstConfigs", tr("Selects a configuration."));
+    auto* label =
+        Described(new QLabel(tr("Verify current configuration"), this), "Label1", verifyTip);
     label->setBuddy(cmdVerifyConfig);
 
     auto* buttons = new QVBoxLayout;

@@ -20,16 +20,7 @@
 
 namespace qzivi {
 
-namespace {
-
-template <typename T>
-T* Made(T* control, const char* name, const QString& tip = {}) {
-    control->setObjectName(name);
-    if (!tip.isEmpty()) control->setToolTip(tip);
-    return control;
-}
-
-} // namespace
+namespace {} // namespace
 
 PSequence::PSequence(QWidget* parent) : NamedListPage(tr("Sequences"), parent) {
     lstSequence = Made(new QListWidget(this), "lstSequence", tr("Selects a sequence."));

@@ -4,6 +4,8 @@
 
 #include "qzivi/support/variant.h"
 
+#include <QString>
+
 #include <cstdint>
 #include <string>
 
@@ -36,6 +38,14 @@ void ClearCombo(QComboBox& list);
 // A rename of a list entry is refused when the text is blank or already the exact name of a
 // member (`indexOfName` is the collection's answer for the text, -1 for none).
 bool RenameRefused(const std::string& text, std::int32_t indexOfName);
+
+// A control of a page, named as its field and with its tool tip (none when empty).
+template <typename T>
+T* Made(T* control, const char* name, const QString& tip = {}) {
+    control->setObjectName(name);
+    if (!tip.isEmpty()) control->setToolTip(tip);
+    return control;
+}
 
 // Each child control of the page, in order, hidden and shown again as it was.
 void ForceRedrawControls(QWidget& page);

@@ -5,6 +5,7 @@
 #pragma once
 
 #include "qzivi/control/PageLink.h"
+#include "qzivi/support/scoped_hook.h"
 
 #include <QWidget>
 
@@ -67,15 +68,8 @@ protected:
     // Runs `fill` with the loading flag set, so that the controls it fills count as no change.
     template <typename F>
     void WhileLoading(F&& fill) {
-        const bool was = m_bLoading;
-        m_bLoading = true;
-        try {
-            fill();
-        } catch (...) {
-            m_bLoading = was;
-            throw;
-        }
-        m_bLoading = was;
+        const FlagHold loading(m_bLoading);
+        fill();
     }
     void LoadControls();
     // Save with its failure ignored, as an apply does.

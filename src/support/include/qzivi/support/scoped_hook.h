@@ -18,4 +18,17 @@ private:
     Hook previous_;
 };
 
+// A flag set for the length of a scope and given back its value on every way out.
+class FlagHold {
+public:
+    explicit FlagHold(bool& flag) : m_rFlag(flag), m_bWas(flag) { flag = true; }
+    ~FlagHold() { m_rFlag = m_bWas; }
+    FlagHold(const FlagHold&) = delete;
+    FlagHold& operator=(const FlagHold&) = delete;
+
+private:
+    bool& m_rFlag;
+    bool m_bWas;
+};
+
 } // namespace qzivi
