@@ -10,6 +10,8 @@
 #include <cstdlib>
 #include <cstring>
 #include <fcntl.h>
+#include <limits>
+#include <new>
 #include <optional>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -23,37 +25,64 @@ static_assert(std::endian::native == std::endian::little, "the integer formats a
 constexpr std::string_view kDelimiters = ";,\t\r\n ";
 constexpr std::size_t kReadSize = 1 << 20;
 
-[[noreturn]] void ImproperFile() {
-    RaiseRuntime(-runtime::kImproperFile, "Improper file type.");
+std::string Quoted(const std::string& filename) {
+    return "\"" + filename + "\"";
 }
-[[noreturn]] void NotAccessible() {
-    RaiseRuntime(-runtime::kFileNotAccessible, "Couldn't access specified file.");
+
+// The readers' own failures; the readers swallow them, and their words become the trouble.
+[[noreturn]] void ImproperFile(const std::string& filename) {
+    RaiseRuntime(-runtime::kImproperFile,
+                 "the data file " + Quoted(filename) + " holds no delimited numbers");
 }
-[[noreturn]] void TooFewData() {
-    RaiseRuntime(-runtime::kTooFewData,
-                 "The number of points requested exceeds the amount of available data.");
+[[noreturn]] void NotAccessible(const std::string& why) {
+    RaiseRuntime(-runtime::kFileNotAccessible, why);
+}
+[[noreturn]] void TooFewData(const std::string& filename, std::int64_t asked) {
+    RaiseRuntime(-runtime::kTooFewData, "the data file " + Quoted(filename) +
+                                            " holds fewer than the " + std::to_string(asked) +
+                                            " points asked for");
+}
+[[noreturn]] void TooManyPoints(const std::string& filename) {
+    RaiseRuntime(-runtime::kOutOfMemory, "the data file " + Quoted(filename) + " holds more than " +
+                                             std::to_string(CDblArrayFromFile::MostPoints()) +
+                                             " points, more than this computer's memory can take");
 }
 [[noreturn]] void CutFails() {
     RaiseRuntime(runtime::kIndexOutOfRange, "Subscript out of range.");
 }
 
+// Reserving beyond this lets the points grow as they are read: a count guessed from the file's
+// length must not claim memory the file's points may never need.
+constexpr std::uint64_t kMostReserved = std::uint64_t{1} << 24;
+
 // The file, open for reading as bytes; closed on every way out.
 class File {
 public:
-    explicit File(const std::string& name) {
-        if (name.empty()) NotAccessible();
+    explicit File(const std::string& name) : name_(name) {
+        if (name.empty()) NotAccessible("no data file is named");
         fd_ = ::open(name.c_str(), O_RDONLY | O_NONBLOCK | O_CLOEXEC); // a FIFO must not block
+        if (fd_ < 0) {
+            const int error = errno;
+            NotAccessible(error == ENOENT ? "the data file " + Quoted(name) + " does not exist"
+                                          : "the data file " + Quoted(name) +
+                                                " cannot be opened: " + std::strerror(error));
+        }
         struct stat info {};
-        if (fd_ < 0 || ::fstat(fd_, &info) != 0 || !S_ISREG(info.st_mode)) {
-            if (fd_ >= 0) ::close(fd_);
-            NotAccessible();
+        if (::fstat(fd_, &info) != 0 || !S_ISREG(info.st_mode)) {
+            ::close(fd_);
+            NotAccessible(Quoted(name) + " is no regular file");
         }
         size_ = static_cast<std::uint64_t>(info.st_size);
+        if (size_ == 0) {
+            ::close(fd_);
+            NotAccessible("the data file " + Quoted(name) + " is empty");
+        }
     }
     ~File() { ::close(fd_); }
     File(const File&) = delete;
     File& operator=(const File&) = delete;
 
+    const std::string& Name() const { return name_; }
     std::uint64_t Size() const { return size_; }
     // Reads up to `size` bytes at `offset`; fewer only at the end of the file.
     std::size_t ReadAt(std::uint64_t offset, char* into, std::size_t size) const {
@@ -62,14 +91,20 @@ public:
             const ssize_t got =
                 ::pread(fd_, into + done, size - done, static_cast<off_t>(offset + done));
             if (got < 0 && errno == EINTR) continue;
-            if (got < 0) NotAccessible();
+            if (got < 0)
+                NotAccessible("the data file " + Quoted(name_) +
+                              " cannot be read: " + std::strerror(errno));
             if (got == 0) break;
             done += static_cast<std::size_t>(got);
         }
         return done;
     }
+    [[noreturn]] void Shrank() const {
+        NotAccessible("the data file " + Quoted(name_) + " shrank while it was read");
+    }
 
 private:
+    std::string name_;
     int fd_ = -1;
     std::uint64_t size_ = 0;
 };
@@ -125,8 +160,10 @@ std::vector<double> ReadIntegers(const std::string& filename, std::int32_t start
     const auto n = static_cast<std::int64_t>(file.Size() / sizeof(Int));
     const std::int64_t available = IntDiv(n, interval) - IntDiv(startIndex, interval);
     const std::int64_t points = count == -1 ? available : count;
-    if (points > available) TooFewData();
+    if (points > available) TooFewData(filename, points);
     if (points <= 0 || startIndex < 0 || interval < 0) return {};
+    if (static_cast<std::uint64_t>(points) > CDblArrayFromFile::MostPoints())
+        TooManyPoints(filename);
 
     std::vector<double> result(static_cast<std::size_t>(points));
     const std::uint64_t step = static_cast<std::uint64_t>(interval);
@@ -141,7 +178,7 @@ std::vector<double> ReadIntegers(const std::string& filename, std::int32_t start
             file.ReadAt(element * sizeof(Int), reinterpret_cast<char*>(chunk.data()),
                         static_cast<std::size_t>(span * sizeof(Int))) /
             sizeof(Int);
-        if (got == 0) NotAccessible(); // the file shrank under us
+        if (got == 0) file.Shrank();
         std::uint64_t k = 0;
         if (step == 1) {
             const std::size_t take = std::min<std::size_t>(got, result.size() - out);
@@ -195,9 +232,10 @@ void TakeTokens(const char* begin, const char* end, char delimiter, std::int64_t
 }
 
 // Nothing for no data; an empty array when no token converted, where the cut of the array fails.
-std::optional<std::vector<double>> SmallFile(const std::string& block, std::size_t firstDigit,
-                                             char delimiter, std::int32_t startIndex,
-                                             std::int32_t interval, std::int32_t count) {
+std::optional<std::vector<double>> SmallFile(const std::string& filename, const std::string& block,
+                                             std::size_t firstDigit, char delimiter,
+                                             std::int32_t startIndex, std::int32_t interval,
+                                             std::int32_t count) {
     const char* begin = block.data() + firstDigit;
     const char* end = block.data() + block.size();
     const auto tokens = static_cast<std::int64_t>(std::count(begin, end, delimiter)) + 1;
@@ -206,7 +244,7 @@ std::optional<std::vector<double>> SmallFile(const std::string& block, std::size
         tokens > startIndex ? (tokens - startIndex + interval - 1) / interval : 0;
     const std::int64_t limit = count == -1 ? available : count;
     if (limit <= 0) return std::nullopt;
-    if (count != -1 && limit > available) TooFewData();
+    if (count != -1 && limit > available) TooFewData(filename, limit);
     std::vector<double> result;
     result.reserve(static_cast<std::size_t>(std::min(limit, tokens)));
     TakeTokens(begin, end, delimiter, startIndex, interval, static_cast<std::uint64_t>(limit),
@@ -220,10 +258,12 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
                               std::int32_t startIndex, std::int32_t interval, std::int32_t count,
                               std::uint64_t estimate) {
     const std::uint64_t length = file.Size();
+    // One point past the most memory takes is enough to know the file is too large.
     const std::uint64_t limit =
-        count == -1 ? length : static_cast<std::uint64_t>(std::max(count, 0));
+        std::min(count == -1 ? length : static_cast<std::uint64_t>(std::max(count, 0)),
+                 CDblArrayFromFile::MostPoints() + 1);
     std::vector<double> result;
-    result.reserve(static_cast<std::size_t>(std::min(limit, estimate)));
+    result.reserve(static_cast<std::size_t>(std::min({limit, estimate, kMostReserved})));
 
     std::vector<char> buffer(kReadSize + 2 * CDblArrayFromFile::kBlockSize);
     std::uint64_t bufferStart = 0, bufferEnd = 0; // file offsets held in the buffer
@@ -238,7 +278,7 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
             bufferStart = textStart;
             bufferEnd = textStart + keep +
                         file.ReadAt(textStart + keep, buffer.data() + keep, buffer.size() - keep);
-            if (bufferEnd < realEnd) NotAccessible(); // the file shrank under us
+            if (bufferEnd < realEnd) file.Shrank();
         }
         const char* text = buffer.data() + (textStart - bufferStart);
         const char* textEnd = buffer.data() + (realEnd - bufferStart);
@@ -255,7 +295,8 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
         skip = 0;
         // Once the points are all taken the rest of the file cannot change the result.
         if (blockEnd >= length || result.size() >= limit) {
-            if (count != -1 && limit >= result.size() + 1) TooFewData();
+            if (result.size() > CDblArrayFromFile::MostPoints()) TooManyPoints(file.Name());
+            if (count != -1 && limit >= result.size() + 1) TooFewData(file.Name(), limit);
             return result;
         }
         textStart = last != nullptr
@@ -265,14 +306,27 @@ std::vector<double> BlockPath(const File& file, std::size_t firstDigit, char del
     }
 }
 
-std::vector<double> ReadText(const std::string& filename, std::int32_t startIndex,
-                             std::int32_t interval, std::int32_t count) {
-    std::optional<std::vector<double>> small;
+// Runs a reader; its failure becomes `trouble` and no data.
+template <typename Read>
+std::vector<double> Swallowed(const std::string& filename, std::string& trouble, Read&& read) {
     try {
+        return read();
+    } catch (const Failure& f) {
+        trouble = f.Description();
+    } catch (const std::bad_alloc&) {
+        trouble = "memory ran out while the data file " + Quoted(filename) + " was read";
+    }
+    return {};
+}
+
+std::vector<double> ReadText(const std::string& filename, std::int32_t startIndex,
+                             std::int32_t interval, std::int32_t count, std::string& trouble) {
+    std::optional<std::vector<double>> small;
+    auto points = Swallowed(filename, trouble, [&]() -> std::vector<double> {
         const File file(filename);
         const std::string block = FirstBlock(file);
         const std::string delimiter = CDblArrayFromFile::FindDelimiter(block);
-        if (delimiter.empty()) ImproperFile();
+        if (delimiter.empty()) ImproperFile(filename);
         const std::size_t firstDigit = block.find_first_of("0123456789");
         // A step of 0 or below, or a start before the first token, reads nothing on either path.
         if (interval <= 0 || startIndex < 0) return {};
@@ -288,22 +342,11 @@ std::vector<double> ReadText(const std::string& filename, std::int32_t startInde
                                            tokens;
             return BlockPath(file, firstDigit, delimiter[0], startIndex, interval, count, estimate);
         }
-        small = SmallFile(block, firstDigit, delimiter[0], startIndex, interval, count);
-    } catch (...) {
+        small = SmallFile(filename, block, firstDigit, delimiter[0], startIndex, interval, count);
         return {};
-    }
+    });
     if (small && small->empty()) CutFails(); // the cut of the array to no element
-    return small ? std::move(*small) : std::vector<double>();
-}
-
-template <typename Int>
-std::vector<double> ReadIntegersOrNothing(const std::string& filename, std::int32_t startIndex,
-                                          std::int32_t interval, std::int32_t count, double scale) {
-    try {
-        return ReadIntegers<Int>(filename, startIndex, interval, count, scale);
-    } catch (...) {
-        return {};
-    }
+    return small ? std::move(*small) : std::move(points);
 }
 
 } // namespace
@@ -324,6 +367,20 @@ std::string CDblArrayFromFile::FindDelimiter(std::string_view text) {
     return {};
 }
 
+std::uint64_t CDblArrayFromFile::MostPoints() {
+    // Half the memory, as doubles, and no more than a point count the instruments can name.
+    static const std::uint64_t most = [] {
+        const long pages = ::sysconf(_SC_PHYS_PAGES), pageSize = ::sysconf(_SC_PAGESIZE);
+        const std::uint64_t memory =
+            pages > 0 && pageSize > 0
+                ? static_cast<std::uint64_t>(pages) * static_cast<std::uint64_t>(pageSize)
+                : std::uint64_t{1} << 32;
+        return std::min<std::uint64_t>(memory / 2 / sizeof(double),
+                                       std::numeric_limits<std::int32_t>::max());
+    }();
+    return most;
+}
+
 std::vector<double> CDblArrayFromFile::RetrieveDblArray(std::int32_t fileType,
                                                         const std::string& filename,
                                                         std::int32_t startIndex,
@@ -331,16 +388,20 @@ std::vector<double> CDblArrayFromFile::RetrieveDblArray(std::int32_t fileType,
                                                         std::int32_t count) const {
     // The readers keep their own failures and give no data, but one: a small text file that has
     // a delimiter and yet no number fails at the cut of its array.
+    m_sTrouble.clear();
     switch (fileType) {
     case DataFileASCII:
-        return ReadText(filename, startIndex, interval, count);
+        return ReadText(filename, startIndex, interval, count, m_sTrouble);
     case DataFile2ByteInteger:
-        return ReadIntegersOrNothing<std::int16_t>(filename, startIndex, interval, count, 32767.0);
+        return Swallowed(filename, m_sTrouble, [&] {
+            return ReadIntegers<std::int16_t>(filename, startIndex, interval, count, 32767.0);
+        });
     case DataFile4ByteInteger:
-        return ReadIntegersOrNothing<std::int32_t>(filename, startIndex, interval, count,
-                                                   2147483647.0);
+        return Swallowed(filename, m_sTrouble, [&] {
+            return ReadIntegers<std::int32_t>(filename, startIndex, interval, count, 2147483647.0);
+        });
     default:
-        ImproperFile();
+        RaiseRuntime(-runtime::kImproperFile, "Improper file type.");
     }
 }
 

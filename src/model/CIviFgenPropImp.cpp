@@ -84,6 +84,7 @@ void CIviFgenPropImp::InitProperties() {
 
 void CIviFgenPropImp::ReadProperties(const PropertyBag& bag, const std::string& prefix,
                                      bool withConfigurations) {
+    CheckItemCounts(bag);
     ReadRows(Properties(), *this, bag, prefix, WithNotice());
     m_oInternal->ReadProperties(bag, prefix);
     m_oWaveforms->ReadProperties(bag, prefix);

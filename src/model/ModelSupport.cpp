@@ -1,6 +1,7 @@
 #include "qzivi/model/ModelSupport.h"
 
 #include "qzivi/model/CIviFgenPropImp.h"
+#include "qzivi/model/PropertyBag.h"
 
 namespace qzivi {
 
@@ -8,13 +9,31 @@ std::string PathOf(const CIviFgenPropImp* propSet) {
     return propSet ? propSet->Path() : std::string();
 }
 
-void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key) {
-    // An item with every value at its default stores nothing, so a count may exceed the values,
-    // but not by this much.
-    constexpr std::size_t kSlack = 1000000;
-    if (count > 0 && static_cast<std::size_t>(count) > entries + kSlack)
-        RaiseRuntime(runtime::kImproperFile, "The property bag claims " + std::to_string(count) +
-                                                 " items under \"" + key + "\" but holds only " +
+void CheckItemCounts(const PropertyBag& bag) {
+    // An item with every value at its default stores nothing, so the counts may claim more items
+    // than the bag holds values, but only by a margin: no instrument takes more channels,
+    // waveforms or sequence steps than this, and a load stays a matter of moments and megabytes.
+    constexpr std::int64_t kImpliedItems = 65536;
+    std::int64_t claimed = 0;
+    std::string largest;
+    std::int32_t largestCount = 0;
+    for (const auto& name : bag.Names()) {
+        if (!name.ends_with("ItemCount") && !name.ends_with("Config_Count")) continue;
+        std::int32_t count = 0;
+        try {
+            count = bag.ReadInt32(name, 0);
+        } catch (const Failure&) {
+            continue; // no number: refused with its type where the tree reads it
+        }
+        if (count <= 0) continue;
+        claimed += count;
+        if (count > largestCount) largestCount = count, largest = name;
+    }
+    const auto entries = static_cast<std::int64_t>(bag.Size());
+    if (claimed > entries + kImpliedItems)
+        RaiseRuntime(runtime::kImproperFile, "The property bag claims " + std::to_string(claimed) +
+                                                 " items (" + std::to_string(largestCount) +
+                                                 " under \"" + largest + "\") but holds only " +
                                                  std::to_string(entries) + " values.");
 }
 

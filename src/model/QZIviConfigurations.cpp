@@ -3,6 +3,7 @@
 
 #include "qzivi/model/CIviFgenPropImp.h"
 #include "qzivi/model/CPropBagFile.h"
+#include "qzivi/support/scoped_hook.h"
 
 namespace qzivi {
 
@@ -30,32 +31,30 @@ void QZIviConfiguration::Attach(std::shared_ptr<CIviErrorReport> errorReport,
 }
 
 void QZIviConfiguration::SetPath(const std::string& parentPath) {
-    m_sPath = JoinPath(parentPath, "Item(\"" + m_sName + "\")");
+    // Without a path above, the sources hold the member's name alone, as for the tree's items.
+    m_sPath =
+        parentPath.empty() ? std::string() : JoinPath(parentPath, "Item(\"" + m_sName + "\")");
 }
 
 void QZIviConfiguration::Import(const std::string& FilePath) {
     Always(m_oErr, m_sPath + "Import", [&] {
-        m_bImporting = true;
-        struct Done {
-            bool& flag;
-            ~Done() { flag = false; }
-        } done{m_bImporting};
+        const FlagHold hold(m_bImporting);
         CPropBagFile file;
         file.LoadPropBagFile(FilePath, m_sFileIdentifier);
         if (!file.Bag())
             RaiseRuntime(runtime::kFileNotFound,
                          "The configuration file \"" + FilePath + "\" does not exist.");
+        // A file this program wrote always holds a snapshot; one without is no configuration.
+        if (file.Bag()->ReadSharedBytes("Bag").empty())
+            RaiseRuntime(-runtime::kImproperFile, "Improper file type. The file \"" + FilePath +
+                                                      "\" holds no configuration.");
         ReadProperties(*file.Bag(), "");
     });
 }
 
 void QZIviConfiguration::Export(const std::string& FilePath) {
     Always(m_oErr, m_sPath + "Export", [&] {
-        m_bExporting = true;
-        struct Done {
-            bool& flag;
-            ~Done() { flag = false; }
-        } done{m_bExporting};
+        const FlagHold hold(m_bExporting);
         CPropBagFile file;
         file.InitPropBagFile(FilePath, m_sFileIdentifier);
         WriteProperties(file.WritableBag(), "");
@@ -199,7 +198,6 @@ std::int32_t QZIviConfigurations::IndexOfName(const std::string& name) const {
 
 void QZIviConfigurations::ReadProperties(const PropertyBag& bag) {
     const std::int32_t count = bag.ReadInt32(kCount, 0);
-    CheckItemCount(count, bag.Size(), kCount);
     for (std::int32_t i = 1; i <= count; ++i) {
         auto item = std::make_shared<QZIviConfiguration>();
         item->Attach(m_oErr, this, m_sFileIdentifier);

@@ -281,7 +281,6 @@ void QZIviFgenSequence::ReadProperties(const PropertyBag& bag, const std::string
     m_lCurrentItem = 1;
     const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
     if (count <= 0) return;
-    CheckItemCount(count, bag.Size(), p + "ItemCount");
     m_oItems.Clear();
     for (std::int32_t i = 1; i <= count; ++i) {
         auto item = std::make_shared<QZIviFgenSequenceItem>();

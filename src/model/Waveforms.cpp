@@ -8,6 +8,7 @@
 #include "qzivi/support/failure.h"
 #include "qzivi/support/wait_cursor.h"
 
+#include <cctype>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
@@ -26,6 +27,19 @@ double Divide(double a, double b) {
 }
 
 constexpr const char* kCollection = "QZIviFgenArbWaveforms";
+
+std::string FormatName(std::int32_t format) {
+    switch (format) {
+    case qzivifgenASCIIFile:
+        return "text";
+    case qzivifgen2ByteInteger:
+        return "16-bit integer";
+    case qzivifgen4ByteInteger:
+        return "32-bit integer";
+    default:
+        return std::to_string(format);
+    }
+}
 
 } // namespace
 
@@ -56,13 +70,18 @@ Points QZIviFgenArbWaveform::ReadData() {
     const bool fromFile = m_lSource > 0 || !m_bDataGotOnce;
     try {
         if (fromFile) result = GetDataSample(0, 1, -1);
+    } catch (const Failure& f) {
+        m_lDataSize = 0;
+        if (f.Number() == errid::kInvalidWaveform) throw;
+        InvalidWaveform(f.Description());
     } catch (...) {
         m_lDataSize = 0;
-        StdError(m_oErr, errid::kInvalidWaveform, m_sName);
+        InvalidWaveform("");
     }
     if (fromFile) {
         if (!result)
-            RaiseRuntime(runtime::kWrongType, "Type mismatch: the file gave no array of points.");
+            RaiseRuntime(runtime::kWrongType, "Type mismatch: the waveform \"" + m_sName +
+                                                  "\" got no points, as " + m_sNoPointsCause + ".");
         m_aData = result;
         if (m_lSource == 0) m_bDataGotOnce = true;
     } else {
@@ -74,6 +93,18 @@ Points QZIviFgenArbWaveform::ReadData() {
     }
     m_lDataSize = static_cast<std::int32_t>(result->size());
     return result;
+}
+
+void QZIviFgenArbWaveform::InvalidWaveform(const std::string& cause) const {
+    try {
+        StdError(m_oErr, errid::kInvalidWaveform, m_sName);
+    } catch (const Failure& f) {
+        if (cause.empty()) throw;
+        std::string told = cause;
+        told[0] = static_cast<char>(std::toupper(static_cast<unsigned char>(told[0])));
+        if (told.back() != '.') told += '.';
+        throw Failure(f.Number(), f.Source(), f.Description() + "  " + told);
+    }
 }
 
 Points QZIviFgenArbWaveform::StoredPoints() {
@@ -106,12 +137,22 @@ Points QZIviFgenArbWaveform::GetDataSample(std::int32_t StartIndex, std::int32_t
     return Guard(m_oErr, "GetDataSample", [&]() -> Points {
         const WaitCursor wait;
         std::error_code error;
+        m_sNoPointsCause = m_sFilename.empty()
+                               ? "no data file is named"
+                               : "the data file \"" + m_sFilename + "\" does not exist";
         if (m_sFilename.empty() || !std::filesystem::exists(m_sFilename, error))
-            StdError(m_oErr, errid::kInvalidWaveform, m_sName);
+            InvalidWaveform(m_sNoPointsCause);
+        const std::int32_t format = m_lSource > 0 ? m_lSource : m_lPersistedWfmSource;
+        const CDblArrayFromFile reader;
         std::vector<double> points =
-            CDblArrayFromFile().RetrieveDblArray(m_lSource > 0 ? m_lSource : m_lPersistedWfmSource,
-                                                 m_sFilename, StartIndex, Interval, Count);
+            reader.RetrieveDblArray(format, m_sFilename, StartIndex, Interval, Count);
+        m_sNoPointsCause = !reader.Trouble().empty() ? reader.Trouble()
+                           : points.size() == 1
+                               ? "the data file \"" + m_sFilename + "\" gives only one point"
+                               : "the data file \"" + m_sFilename + "\" gives no points in the " +
+                                     FormatName(format) + " format";
         if (points.size() <= 1) return nullptr;
+        m_sNoPointsCause.clear();
         Normalize(points);
         return std::make_shared<const std::vector<double>>(std::move(points));
     });

@@ -183,7 +183,7 @@ Points PArb::PointsOfFields(QZIviFgenArbWaveform* model) {
     Points points = probe.GetDataSample(0, 1, -1);
     if (!points)
         throw Failure(errid::kInvalidWaveform, file,
-                      "Invalid Waveform. (" + file + " holds no points in this format)");
+                      "Invalid Waveform. (" + probe.NoPointsCause() + ")");
     // The instrument's limit is known only while the control has a session.
     const auto& selected = SelectedControls();
     const bool session = !selected.empty() && selected[0] && selected[0]->SessionHandle() != 0;

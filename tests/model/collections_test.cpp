@@ -1,5 +1,6 @@
 // The collections of the object model: names, positions, the active channel, the cascades of
 // Remove, and the reference rules of channels and sequence items.
+#include "qzivi/driver/ErrorIds.h"
 #include "qzivi/model/PropertyBag.h"
 #include "tree_fixture.h"
 
@@ -253,6 +254,34 @@ TEST_F(WaveformsTest, GetDataSampleGivesNoneForOnePointAndFailsForNoFile) {
     w->SetWaveformHandle(9);
     EXPECT_TRUE(w->ForceReload());
     EXPECT_EQ(w->WaveformHandle(), 0);
+}
+
+// A file that gives no points is told by its cause, under the number the step that met it has;
+// the waveform keeps its file, to be read again once the file is mended.
+TEST_F(WaveformsTest, AFileWithoutPointsIsToldByItsCause) {
+    const struct {
+        std::string path;
+        std::int32_t number;
+        std::string told;
+    } cases[] = {
+        {(dir_ / "gone.txt").string(), -31613, "Invalid Waveform. (W)  The data file \""},
+        {dir_.string(), errid::kInvalidType, "is no regular file."},
+        {File("one.txt", "1,"), errid::kInvalidType, "gives only one point."},
+        {File("words.txt", "volts and amps"), errid::kInvalidType, "holds no delimited numbers."},
+    };
+    for (const auto& c : cases) {
+        const auto w = waveforms().Add("W", qzivifgenASCIIFile, c.path);
+        try {
+            w->Data();
+            ADD_FAILURE() << c.path;
+        } catch (const Failure& f) {
+            EXPECT_EQ(f.Number(), c.number) << f.Description();
+            EXPECT_NE(f.Description().find(c.told), std::string::npos) << f.Description();
+            EXPECT_NE(f.Description().find(c.path), std::string::npos) << f.Description();
+        }
+        EXPECT_EQ(w->Filename(), c.path);
+        EXPECT_EQ(Raised([&] { w->DataSize(); }), c.number) << "asked again, told again";
+    }
 }
 
 TEST_F(WaveformsTest, NormalizeInEveryMode) {

@@ -140,12 +140,33 @@ TEST_F(DataFileTest, IntegerFormatsScaleAndStep) {
         reader_.RetrieveDblArray(DataFile4ByteInteger, Write("", "empty.bin"), 0, 1, -1).empty());
 }
 
-TEST_F(DataFileTest, BadFilesGiveNoDataAndAnUnknownTypeFails) {
-    EXPECT_TRUE(
-        reader_.RetrieveDblArray(DataFileASCII, (dir_ / "missing.txt").string(), 0, 1, -1).empty());
-    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile2ByteInteger, "", 0, 1, -1).empty());
-    EXPECT_TRUE(reader_.RetrieveDblArray(DataFile4ByteInteger, dir_.string(), 0, 1, -1).empty())
-        << "a folder";
+TEST_F(DataFileTest, BadFilesGiveNoDataWithTheirCauseAndAnUnknownTypeFails) {
+    // A sparse file of 2^33 16-bit points: more than any memory takes, refused before reading.
+    const std::string huge = (dir_ / "huge.i16").string();
+    std::ofstream(huge, std::ios::binary) << "ab";
+    fs::resize_file(huge, std::uintmax_t{1} << 34);
+    const struct {
+        std::int32_t format;
+        std::string path;
+        std::int32_t count;
+        std::string trouble;
+    } cases[] = {
+        {DataFileASCII, (dir_ / "missing.txt").string(), -1, "does not exist"},
+        {DataFile2ByteInteger, "", -1, "no data file is named"},
+        {DataFile4ByteInteger, dir_.string(), -1, "is no regular file"},
+        {DataFileASCII, Write("", "empty.txt"), -1, "is empty"},
+        {DataFileASCII, Write("volts", "words.txt"), -1, "holds no delimited numbers"},
+        {DataFile2ByteInteger, Write("abcd", "two.i16"), 3, "fewer than the 3 points asked for"},
+        {DataFile2ByteInteger, huge, -1, "more than this computer's memory can take"},
+    };
+    for (const auto& c : cases) {
+        EXPECT_TRUE(reader_.RetrieveDblArray(c.format, c.path, 0, 1, c.count).empty()) << c.path;
+        EXPECT_NE(reader_.Trouble().find(c.trouble), std::string::npos) << reader_.Trouble();
+    }
+    EXPECT_EQ(reader_.RetrieveDblArray(DataFile2ByteInteger, huge, 0, 1, 1),
+              V{('b' * 256 + 'a') / 32767.0})
+        << "a part of it is read";
+    EXPECT_EQ(reader_.Trouble(), "");
     try {
         reader_.RetrieveDblArray(4, Write("1,2"), 0, 1, -1);
         FAIL();

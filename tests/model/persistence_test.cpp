@@ -123,6 +123,34 @@ TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
     PropertyBag bag;
     bag.WriteInt32("Waveforms_ItemCount", 2000000000, 0);
     EXPECT_EQ(Raised([&] { NewTree()->ReadProperties(bag, "", true); }), runtime::kImproperFile);
+    // The margin for items that store nothing is shared by the whole bag: a million channels,
+    // or fifty sequences of forty thousand steps each, are refused before any is made.
+    PropertyBag channels;
+    channels.WriteInt32("Channels_ItemCount", 1000000, 0);
+    PropertyBag sequences;
+    sequences.WriteInt32("Sequences_ItemCount", 50, 0);
+    for (int i = 1; i <= 50; ++i)
+        sequences.WriteInt32("Sequences_Item" + std::to_string(i) + "_Sequence_ItemCount", 40000,
+                             0);
+    for (const PropertyBag* hostile : {&channels, &sequences}) {
+        auto tree = NewTree();
+        EXPECT_EQ(Raised([&] { tree->ReadProperties(*hostile, "", true); }),
+                  runtime::kImproperFile);
+        EXPECT_EQ(tree->Sequences()->Count(), 0) << "nothing half read";
+    }
+    try {
+        NewTree()->ReadProperties(sequences, "", true);
+    } catch (const Failure& f) {
+        EXPECT_NE(f.Description().find("claims 2000050 items (40000 under"), std::string::npos)
+            << f.Description();
+    }
+    // Within the margin a bag loads, its default items made.
+    PropertyBag spare;
+    spare.WriteInt32("Sequences_ItemCount", 2, 0);
+    spare.WriteInt32("Sequences_Item2_Sequence_ItemCount", 30000, 0);
+    auto tree = NewTree();
+    ASSERT_EQ(Raised([&] { tree->ReadProperties(spare, "", true); }), 0);
+    EXPECT_EQ(tree->Sequences()->Item(2)->Count(), 30000);
     PropertyBag shortPoints;
     shortPoints.WriteInt32("Waveforms_ItemCount", 1, 0);
     shortPoints.WriteInt32("Waveforms_Item1_Waveform_Source", 0, 1);

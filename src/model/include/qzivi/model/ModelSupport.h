@@ -42,8 +42,8 @@ auto Guard(const std::shared_ptr<CIviErrorReport>& err, const char* source, F&& 
 class CIviFgenPropImp;
 class PropertyBag;
 
-// The item count a bag claims, refused when no bag this program wrote could hold it.
-void CheckItemCount(std::int32_t count, std::size_t entries, const std::string& key);
+// The item counts a whole bag claims, refused when no bag this program wrote could hold them.
+void CheckItemCounts(const PropertyBag& bag);
 
 // Reads a limit of the instrument under the state rules of the session: the mask 9, busy for the
 // call, the state given back on every way out. 0 when no session is open.
@@ -89,7 +89,6 @@ public:
         const std::string p = BagPrefix(prefix, word_);
         const std::int32_t count = bag.ReadInt32(p + "ItemCount", 0);
         if (count <= 0) return;
-        CheckItemCount(count, bag.Size(), p + "ItemCount");
         m_oItems.Clear();
         for (std::int32_t i = 1; i <= count; ++i) {
             auto item = std::make_shared<Item>();

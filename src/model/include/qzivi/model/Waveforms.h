@@ -61,9 +61,13 @@ public:
     bool DataGotOnce() const { return m_bDataGotOnce; }
     void DataGotOnce(bool value) { m_bDataGotOnce = value; }
     void Normalize(std::vector<double>& points) const;
+    // Why the last read of the file gave no points, in words; empty when it gave points.
+    const std::string& NoPointsCause() const { return m_sNoPointsCause; }
 
 private:
     Points ReadData();
+    // Error -31613 from `Name`, its text followed by `cause`.
+    [[noreturn]] void InvalidWaveform(const std::string& cause) const;
     // The points a persisted waveform stores and copies.
     Points StoredPoints();
 
@@ -76,6 +80,7 @@ private:
     bool m_bDataGotOnce = false;
     Points m_aData;
     std::int32_t m_lDataSize = 0;
+    std::string m_sNoPointsCause;
     std::shared_ptr<CIviErrorReport> m_oErr;
     std::weak_ptr<CIviFgenPropImp> m_oPropSet;
     std::string m_sPath;
