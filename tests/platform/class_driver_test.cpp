@@ -195,15 +195,45 @@ TEST_F(ClassDriverTest, AFunctionTheModuleLacksIsNotSupported) {
     EXPECT_THAT(LastError(s.vi()), HasSubstr("Function or method not supported."));
 }
 
-TEST_F(ClassDriverTest, AModuleOthersCanWriteIsNeverLoaded) {
-    const auto copy = store_.Dir() / "libshared.so";
-    std::filesystem::copy_file(QZIVI_TEST_SIM_MODULE, copy);
-    std::filesystem::permissions(copy, std::filesystem::perms(0666));
-    store_.UseStore("[Shared]\nmodule = libshared.so\nprefix = QZSimFgen\n");
-    ViSession vi = 0;
-    EXPECT_EQ(IviFgen_InitWithOptions("Shared", VI_FALSE, VI_FALSE, "", &vi),
-              IVI_ERROR_FILE_NOT_SECURE);
-    EXPECT_THAT(LastError(VI_NULL), HasSubstr(copy.string()));
+// A module runs inside the caller: it is loaded only when no one but its owner (or root) can have
+// put it there, the whole way down its path.
+TEST_F(ClassDriverTest, AModuleOthersCanReachIsNeverLoaded) {
+    namespace fs = std::filesystem;
+    const auto place = [&](const std::string& folder, fs::perms folderMode, fs::perms fileMode) {
+        fs::create_directories(store_.Dir() / folder);
+        const auto copy = store_.Dir() / folder / "libfgen.so";
+        fs::copy_file(QZIVI_TEST_SIM_MODULE, copy, fs::copy_options::overwrite_existing);
+        fs::permissions(copy, fileMode);
+        fs::permissions(store_.Dir() / folder, folderMode);
+    };
+    place("shared", fs::perms(0755), fs::perms(0666));
+    place("open", fs::perms(0777), fs::perms(0644));
+    place("sticky", fs::perms(01777), fs::perms(0644));
+    const struct {
+        std::string module;
+        ViStatus status;
+        std::string why;
+    } cases[] = {
+        {"shared/libfgen.so", IVI_ERROR_FILE_NOT_SECURE, "it can be written by any user"},
+        {"open/libfgen.so", IVI_ERROR_FILE_NOT_SECURE, "/open\" can be written by any user"},
+        {"sticky/../shared/libfgen.so", IVI_ERROR_FILE_NOT_SECURE, "(\"..\")"},
+        {"sticky/libfgen.so", VI_SUCCESS, ""}, // a sticky folder, as /tmp, holding the user's own
+    };
+    for (const auto& c : cases) {
+        store_.UseStore("[Lab]\nmodule = " + c.module + "\nprefix = QZSimFgen\n");
+        ViSession vi = 0;
+        EXPECT_EQ(IviFgen_InitWithOptions("Lab", VI_FALSE, VI_FALSE, "", &vi), c.status)
+            << c.module;
+        if (c.status == VI_SUCCESS) {
+            EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
+            continue;
+        }
+        const std::string told = LastError(VI_NULL);
+        EXPECT_THAT(told, HasSubstr((store_.Dir() / c.module).string()));
+        EXPECT_THAT(told, HasSubstr(c.why));
+    }
+    for (const char* folder : {"open", "sticky"})
+        fs::permissions(store_.Dir() / folder, fs::perms(0755));
 }
 
 } // namespace

@@ -121,6 +121,49 @@ void RefuseIfWritableByOthers(const std::string& path, std::string_view what) {
                               "remove that permission (chmod o-w)");
 }
 
+int OpenTrustedFile(const std::string& path, std::string_view what) {
+    const auto refuse = [&](const std::string& why) {
+        throw StatusError(IVI_ERROR_FILE_NOT_SECURE,
+                          std::string(what) + " \"" + path + "\" is refused: " + why);
+    };
+    for (const auto& part : std::filesystem::path(path))
+        if (part == "..") refuse("its path climbs out of a folder (\"..\")");
+    char* resolved = ::realpath(path.c_str(), nullptr);
+    if (resolved == nullptr)
+        refuse(std::string("its path cannot be followed: ") + std::strerror(errno));
+    const std::string real = resolved;
+    std::free(resolved);
+    // Each folder from the root down, and what lies in it.
+    for (std::size_t slash = 0; slash != std::string::npos && slash + 1 < real.size();) {
+        const std::string folder = slash == 0 ? "/" : real.substr(0, slash);
+        const std::size_t next = real.find('/', slash + 1);
+        const std::string inner = real.substr(0, next);
+        struct stat folderInfo {
+        }, innerInfo{};
+        if (::stat(folder.c_str(), &folderInfo) != 0 || ::lstat(inner.c_str(), &innerInfo) != 0)
+            refuse(std::string("its path cannot be followed: ") + std::strerror(errno));
+        const bool sticky = (folderInfo.st_mode & S_ISVTX) != 0;
+        const bool ownInner = innerInfo.st_uid == ::getuid() || innerInfo.st_uid == 0;
+        if ((folderInfo.st_mode & S_IWOTH) != 0 && !(sticky && ownInner))
+            refuse("the folder \"" + folder +
+                   "\" can be written by any user (remove that permission: chmod o-w)");
+        slash = next;
+    }
+    const int fd = ::open(real.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW | O_NONBLOCK);
+    if (fd < 0)
+        throw StatusError(IVI_ERROR_CANNOT_LOAD_MODULE,
+                          std::string(what) + " \"" + path +
+                              "\" cannot be opened: " + std::strerror(errno));
+    struct stat info {};
+    if (::fstat(fd, &info) != 0 || !S_ISREG(info.st_mode) || (info.st_mode & S_IWOTH) != 0) {
+        ::close(fd);
+        refuse(S_ISREG(info.st_mode)
+                   ? "it can be written by any user (remove that permission: chmod o-w)"
+                   : "it is no regular file");
+    }
+    return fd;
+}
+
 std::vector<std::string> ConfigStoreSearchOrder() {
     if (const std::string named = Env("QZIVI_CONFIG_STORE"); !named.empty()) return {named};
     std::vector<std::string> order;

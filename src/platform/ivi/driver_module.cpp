@@ -7,6 +7,7 @@
 #include <map>
 #include <mutex>
 #include <sys/stat.h>
+#include <unistd.h>
 
 namespace qzivi::ivi {
 
@@ -57,8 +58,16 @@ std::shared_ptr<DriverModule> LoadDriverModule(const DriverSession& session,
     struct stat info {};
     if (::stat(file.c_str(), &info) != 0)
         throw StatusError(IVI_ERROR_CANNOT_LOAD_MODULE, where + " does not exist");
-    RefuseIfWritableByOthers(file, "driver module");
-    void* library = ::dlopen(file.c_str(), RTLD_NOW | RTLD_LOCAL);
+    void* library = nullptr;
+    {
+        const int fd = OpenTrustedFile(file, "driver module");
+        // Loaded through the descriptor, the file checked is the file run; without /proc the
+        // path is all there is.
+        const std::string opened = "/proc/self/fd/" + std::to_string(fd);
+        library = ::dlopen(::access(opened.c_str(), R_OK) == 0 ? opened.c_str() : file.c_str(),
+                           RTLD_NOW | RTLD_LOCAL);
+        ::close(fd);
+    }
     if (library == nullptr) {
         const char* why = ::dlerror();
         throw StatusError(IVI_ERROR_CANNOT_LOAD_MODULE,

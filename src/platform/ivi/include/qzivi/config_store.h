@@ -68,4 +68,11 @@ ConfigStore LoadConfigStore();
 // file, since a driver it names runs inside the caller's process.
 void RefuseIfWritableByOthers(const std::string& path, std::string_view what);
 
+// Opens a file whose code the process will run, and gives its descriptor, for the caller to load
+// that very file through (no second look-up by path that a swap could slip into). Refused with
+// IVI_ERROR_FILE_NOT_SECURE: a path with "..", a file others may write, and a folder on its way
+// that others may write, unless the folder is sticky (as /tmp) and what lies in it belongs to the
+// user or to root. The caller reports a missing file its own way, before.
+int OpenTrustedFile(const std::string& path, std::string_view what);
+
 } // namespace qzivi::ivi
