@@ -168,7 +168,9 @@ std::vector<double> ReadIntegers(const std::string& filename, std::int32_t start
     std::vector<double> result(static_cast<std::size_t>(points));
     const std::uint64_t step = static_cast<std::uint64_t>(interval);
     // Elements are read in runs of whole chunks and picked out: one pass, in order.
-    std::vector<Int> chunk(kReadSize / sizeof(Int));
+    const std::uint64_t span = (static_cast<std::uint64_t>(points) - 1) * step + 1;
+    std::vector<Int> chunk(static_cast<std::size_t>(
+        std::min<std::uint64_t>(span, kReadSize / sizeof(Int)))); // a small file, a small buffer
     std::uint64_t element = static_cast<std::uint64_t>(startIndex);
     std::size_t out = 0;
     while (out < result.size()) {

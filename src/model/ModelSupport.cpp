@@ -11,9 +11,9 @@ std::string PathOf(const CIviFgenPropImp* propSet) {
 
 void CheckItemCounts(const PropertyBag& bag) {
     // An item with every value at its default stores nothing, so the counts may claim more items
-    // than the bag holds values, but only by a margin: no instrument takes more channels,
-    // waveforms or sequence steps than this, and a load stays a matter of moments and megabytes.
-    constexpr std::int64_t kImpliedItems = 65536;
+    // than the bag holds values, but only by a margin: an item worth keeping stores its name or
+    // its waveform, and a load stays a matter of moments and kilobytes.
+    constexpr std::int64_t kImpliedItems = 4096;
     std::int64_t claimed = 0;
     std::string largest;
     std::int32_t largestCount = 0;

@@ -1,5 +1,6 @@
 // Waveform data files: the three formats, the text reader's rules and quirks, and a comparison
 // with a literal model of those rules over many generated files.
+#include "literal_reader.h"
 #include "qzivi/model/CDblArrayFromFile.h"
 #include "qzivi/support/failure.h"
 
@@ -53,6 +54,8 @@ protected:
 };
 
 using V = std::vector<double>;
+using test::Literal;
+using test::LiteralRead;
 
 TEST_F(DataFileTest, TextSplitsAtTheDelimiterFoundAfterTheFirstDigit) {
     EXPECT_EQ(Text("0,1,2,3,4,5", 1, 2), (V{1, 3, 5}));
@@ -190,95 +193,6 @@ TEST_F(DataFileTest, BadFilesGiveNoDataWithTheirCauseAndAnUnknownTypeFails) {
         } catch (const Failure& f) {
             EXPECT_EQ(f.Number(), runtime::kIndexOutOfRange);
         }
-    }
-}
-
-// ---- The literal model ------------------------------------------------------------------------
-
-// The rules of the text reader taken word for word: whole blocks of 10000 characters padded with
-// NUL, split into tokens, each token converted on its own. Slow, and independent of the reader.
-struct Literal {
-    std::optional<V> values; // nothing: no data
-    bool cutFails = false;
-};
-
-bool Convert(std::string token, double& out) {
-    token = token.substr(0, token.find('\0'));
-    const auto first = token.find_first_not_of(" \t\n\r\v\f");
-    if (first == std::string::npos) return false;
-    token = token.substr(first, token.find_last_not_of(" \t\n\r\v\f") - first + 1);
-    std::size_t at = token[0] == '+' || token[0] == '-' ? 1 : 0;
-    if (at >= token.size() ||
-        !(std::isdigit(static_cast<unsigned char>(token[at])) || token[at] == '.'))
-        return false;
-    if (token.find_first_of("xXpP") != std::string::npos) return false;
-    char* end = nullptr;
-    out = std::strtod(token.c_str(), &end);
-    return end == token.c_str() + token.size() && std::isfinite(out);
-}
-
-std::vector<std::string> Split(const std::string& text, char delimiter) {
-    std::vector<std::string> tokens(1);
-    for (char c : text) {
-        if (c == delimiter)
-            tokens.emplace_back();
-        else
-            tokens.back().push_back(c);
-    }
-    return tokens;
-}
-
-Literal LiteralRead(const std::string& file, std::int64_t start, std::int64_t interval,
-                    std::int64_t count) {
-    const std::size_t B = 10000;
-    auto block = [&](std::size_t k) {
-        std::string b = k * B < file.size() ? file.substr(k * B, B) : std::string();
-        b.resize(B, '\0');
-        return b;
-    };
-    std::string text = block(0);
-    const std::string delimiter = CDblArrayFromFile::FindDelimiter(text);
-    if (delimiter.empty()) return {};
-    const char d = delimiter[0];
-    const std::size_t firstDigit = text.find_first_of("0123456789");
-    if (interval <= 0 || start < 0) return {}; // the division, or a token before the first, fails
-    V out;
-    if (file.size() <= B) {
-        const auto tokens = Split(text.substr(firstDigit), d);
-        const auto t = std::int64_t(tokens.size());
-        const std::int64_t available = t > start ? (t - start + interval - 1) / interval : 0;
-        const std::int64_t limit = count == -1 ? available : count;
-        if (limit <= 0) return {};
-        if (count != -1 && limit > available) return {};
-        for (std::int64_t i = start;
-             i <= std::int64_t(tokens.size()) - 1 && std::int64_t(out.size()) < limit;
-             i += interval) {
-            double v;
-            if (Convert(tokens[std::size_t(i)], v)) out.push_back(v);
-        }
-        if (out.empty()) return {std::nullopt, true};
-        return {out, false};
-    }
-    const std::int64_t limit = count == -1 ? std::int64_t(file.size()) : count;
-    std::size_t skip = firstDigit;
-    for (std::size_t k = 0;; ++k) {
-        const std::size_t cut = text.rfind(d);
-        const std::string body = cut == std::string::npos ? text : text.substr(0, cut + 1);
-        const std::string tail = cut == std::string::npos ? std::string() : text.substr(cut + 1);
-        const auto tokens = Split(body.substr(skip), d);
-        for (std::int64_t i = k == 0 ? start : 0;
-             i <= std::int64_t(tokens.size()) - 1 && std::int64_t(out.size()) < limit;
-             i += interval) {
-            double v;
-            if (Convert(tokens[std::size_t(i)], v)) out.push_back(v);
-        }
-        if ((k + 1) * B >= file.size()) {
-            if (count != -1 && limit >= std::int64_t(out.size()) + 1) return {};
-            if (out.empty()) return {};
-            return {out, false};
-        }
-        text = tail + block(k + 1);
-        skip = 0;
     }
 }
 

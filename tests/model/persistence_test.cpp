@@ -147,10 +147,10 @@ TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
     // Within the margin a bag loads, its default items made.
     PropertyBag spare;
     spare.WriteInt32("Sequences_ItemCount", 2, 0);
-    spare.WriteInt32("Sequences_Item2_Sequence_ItemCount", 30000, 0);
+    spare.WriteInt32("Sequences_Item2_Sequence_ItemCount", 4000, 0);
     auto tree = NewTree();
     ASSERT_EQ(Raised([&] { tree->ReadProperties(spare, "", true); }), 0);
-    EXPECT_EQ(tree->Sequences()->Item(2)->Count(), 30000);
+    EXPECT_EQ(tree->Sequences()->Item(2)->Count(), 4000);
     PropertyBag shortPoints;
     shortPoints.WriteInt32("Waveforms_ItemCount", 1, 0);
     shortPoints.WriteInt32("Waveforms_Item1_Waveform_Source", 0, 1);
