@@ -1,0 +1,204 @@
+// The instrument emulator: the SCPI grammar as a stream of bytes brings it, and the emulated
+// generator, whose settings reach the simulator and so its rendered output.
+#include "Emulator.h"
+#include "Scpi.h"
+#include "platform/test_support.h"
+
+#include <gmock/gmock.h>
+
+#include <cmath>
+#include <cstring>
+
+namespace qzivi {
+namespace {
+
+using scpi::MessageReader;
+using ::testing::ElementsAre;
+using ::testing::HasSubstr;
+
+std::vector<std::string> Messages(MessageReader& reader, std::string_view bytes) {
+    reader.Feed(bytes);
+    std::vector<std::string> out;
+    std::string message;
+    for (;;) {
+        const auto got = reader.Next(message);
+        if (got == MessageReader::Got::Nothing) return out;
+        out.push_back(got == MessageReader::Got::Message ? message : "<too long>");
+    }
+}
+
+TEST(ScpiGrammar, MessagesEndAtNewlinesOutsideStringsAndBlocks) {
+    MessageReader reader;
+    // A block may hold a newline and a ';', a string a newline; a message may come in pieces.
+    EXPECT_THAT(Messages(reader, "FREQ 1\r\nDATA:ARB a,#15\n;x\na\nDATA:ARB b,#2"),
+                ElementsAre("FREQ 1", "DATA:ARB a,#15\n;x\na"));
+    EXPECT_THAT(Messages(reader, "03\n\n"), ElementsAre());
+    EXPECT_THAT(Messages(reader, "\n\nDISP:TEXT 'a\nb'\n"),
+                ElementsAre("DATA:ARB b,#203\n\n\n", "DISP:TEXT 'a\nb'"));
+    MessageReader small(8);
+    EXPECT_THAT(Messages(small, "FREQ 1000000000"), ElementsAre());
+    EXPECT_THAT(Messages(small, "0\n*IDN?\n"), ElementsAre("<too long>", "*IDN?"));
+}
+
+TEST(ScpiGrammar, HeadersMatchShortOrLongFormsInAnyCaseWithOptionalNodes) {
+    const auto nodes = [](std::string_view message) {
+        return scpi::ParseMessage(message).commands.at(0).nodes;
+    };
+    int suffix = 0;
+    const char* pattern = "[SOURce#:]VOLTage[:LEVel]:OFFSet";
+    EXPECT_TRUE(scpi::Matches(pattern, nodes("volt:offs 1"), &suffix));
+    EXPECT_EQ(suffix, 1);
+    EXPECT_TRUE(scpi::Matches(pattern, nodes("SOURce2:VOLTAGE:level:OFFSET 1"), &suffix));
+    EXPECT_EQ(suffix, 2);
+    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLTA:OFFS 1"), nullptr)) << "neither form";
+    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLT2:OFFS 1"), nullptr)) << "no suffix there";
+    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLT 1"), nullptr));
+
+    const auto parsed = scpi::ParseMessage("SOUR2:FREQ 1 KHZ;VOLT? ; *TRG;:OUTP 'on', #13a,b");
+    ASSERT_FALSE(parsed.error);
+    ASSERT_EQ(parsed.commands.size(), 4u);
+    EXPECT_THAT(parsed.commands[1].nodes, ElementsAre("SOUR2", "VOLT")) << "the path carries";
+    EXPECT_EQ(parsed.commands[1].carried, 1u);
+    EXPECT_TRUE(parsed.commands[1].query);
+    EXPECT_TRUE(parsed.commands[2].common);
+    EXPECT_THAT(parsed.commands[3].nodes, ElementsAre("OUTP")) << "':' starts from the root";
+    ASSERT_EQ(parsed.commands[3].params.size(), 2u);
+    EXPECT_EQ(parsed.commands[3].params[0].kind, scpi::ParamKind::String);
+    EXPECT_EQ(parsed.commands[3].params[1].value, "a,b");
+
+    for (const auto& [message, number] :
+         std::vector<std::pair<std::string, int>>{{"FREQ 1,,2", -109},
+                                                  {"DATA:ARB a,#19ab", -161},
+                                                  {"FR@Q 1", -102},
+                                                  {"DISP:TEXT 'open", -151},
+                                                  {"VERYLONGKEYWORD 1", -112}})
+        EXPECT_EQ(scpi::ParseMessage(message).error.value_or(scpi::Error{0, ""}).number, number)
+            << message;
+}
+
+TEST(ScpiGrammar, NumbersTakeUnitsWithTheirPrefixesAndTheWordsForLimits) {
+    const auto n = [](const char* text, const char* unit = "") {
+        return scpi::ParseNumber({scpi::ParamKind::Text, text}, -1, 1, 0.5, unit);
+    };
+    EXPECT_DOUBLE_EQ(n("1.5 KHZ", "HZ"), 1500);
+    EXPECT_DOUBLE_EQ(n("2MHz", "HZ"), 2e6) << "M is mega for hertz";
+    EXPECT_DOUBLE_EQ(n("20mV", "V"), 0.02) << "and milli for volts";
+    EXPECT_DOUBLE_EQ(n("+3e-3"), 3e-3);
+    EXPECT_DOUBLE_EQ(n("max"), 1);
+    EXPECT_DOUBLE_EQ(n("MINimum"), -1);
+    EXPECT_DOUBLE_EQ(n("def"), 0.5);
+    for (const char* bad : {"12 furlongs", "1 V", "abc", "nan"})
+        EXPECT_THROW(n(bad, "HZ"), scpi::Error) << bad;
+    EXPECT_EQ(scpi::Block("ab"), "#12ab");
+    EXPECT_EQ(scpi::FormatNumber(1000), "+1.000000000000000E+03");
+}
+
+class EmulatorTest : public ::testing::Test {
+protected:
+    EmulatorTest() { ::setenv("QZIVI_SESSION_MANAGER", "none", 1); }
+
+    std::vector<double> Render(int channel, double step, int count) {
+        const std::string answer =
+            emu_.Execute("SOUR" + std::to_string(channel) + ":EMUL:REND? 0," +
+                         std::to_string(step) + "," + std::to_string(count));
+        std::vector<double> volts;
+        for (const char* p = answer.c_str(); *p != '\0';) {
+            char* end = nullptr;
+            volts.push_back(std::strtod(p, &end));
+            p = *end == ',' ? end + 1 : end;
+        }
+        return volts;
+    }
+    std::string Error() { return emu_.Execute("SYST:ERR?"); }
+
+    test::StoreScope store_;
+    emu::Emulator emu_;
+};
+
+TEST_F(EmulatorTest, SettingsReachTheSimulatorsOutput) {
+    EXPECT_THAT(emu_.Execute("*IDN?"), HasSubstr(",33522B,"));
+    emu_.Execute("FUNC SQU;FREQ 2 kHz;VOLT 2;VOLT:OFFS 0.5;:OUTP ON");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    EXPECT_EQ(emu_.Execute("FUNC?;FREQ?;VOLT?;OUTP?"),
+              "SQU;+2.000000000000000E+03;+2.000000000000000E+00;1");
+    EXPECT_THAT(Render(1, 1e-4, 6), ElementsAre(1.5, 1.5, 1.5, -0.5, -0.5, 1.5));
+    EXPECT_THAT(Render(2, 1e-4, 2), ElementsAre(0, 0)) << "channel 2's output is off";
+    emu_.Execute("VOLT:HIGH 3;VOLT:LOW -1");
+    EXPECT_EQ(emu_.Execute("VOLT?;VOLT:OFFS?"), "+4.000000000000000E+00;+1.000000000000000E+00");
+    emu_.Execute("OUTP:LOAD INF");
+    EXPECT_EQ(emu_.Execute("OUTP:LOAD?"), "+9.900000000000000E+37");
+}
+
+TEST_F(EmulatorTest, ArbitraryDataInEachFormPlaysAtTheSampleRate) {
+    const std::vector<double> ramp = {0, 0.25, 0.5, 0.75, 1, 0.5, 0, -0.5};
+    std::string floats;
+    for (double v : ramp) {
+        const float f = static_cast<float>(v);
+        char bytes[4];
+        std::memcpy(bytes, &f, 4);
+        floats.append(bytes, 4);
+    }
+    emu_.Execute("FORM:BORD SWAP;:DATA:ARB BIN," + scpi::Block(floats));
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    emu_.Execute("DATA:ARB TXT,0,0.25,0.5,0.75,1,0.5,0,-0.5");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    emu_.Execute("DATA:ARB:DAC DAC,0,8192,16384,24576,32767,16384,0,-16384");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    emu_.Execute("OUTP ON;:FUNC ARB;:FUNC:ARB:SRAT 1e4");
+    for (const char* name : {"BIN", "TXT", "DAC"}) {
+        emu_.Execute(std::string("FUNC:ARB ") + name);
+        const auto volts = Render(1, 1e-4, 8);
+        ASSERT_EQ(volts.size(), ramp.size());
+        for (std::size_t i = 0; i < ramp.size(); ++i)
+            EXPECT_NEAR(volts[i], ramp[i], 1e-4) << name << " " << i;
+    }
+    // A sequence of two of them, twice and once.
+    emu_.Execute("DATA:SEQ " +
+                 scpi::Block("\"SEQ\",\"TXT\",2,repeat,maintain,4,\"BIN\",0,once,maintain,4"));
+    emu_.Execute("FUNC:ARB SEQ");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    const auto volts = Render(1, 1e-4, 24);
+    EXPECT_NEAR(volts[8], ramp[0], 1e-4);
+    EXPECT_NEAR(volts[12], ramp[4], 1e-4);
+    EXPECT_NEAR(volts[20], ramp[4], 1e-4);
+}
+
+TEST_F(EmulatorTest, RefusalsQueueTheirErrorsAndChangeNothing) {
+    emu_.Execute("FREQ 5000");
+    emu_.Execute("FREQ 1e12");
+    emu_.Execute("BOGUS:NODE 1");
+    emu_.Execute("SOUR3:FREQ 1");
+    emu_.Execute("FREQ");
+    emu_.Execute("FUNC:ARB NOSUCH");
+    emu_.Execute("DATA:ARB W,2,0,0,0,0,0,0,0");
+    EXPECT_THAT(Error(), HasSubstr("-222,\"Data out of range;"));
+    EXPECT_EQ(Error(), "-113,\"Undefined header\"");
+    EXPECT_EQ(Error(), "-114,\"Header suffix out of range\"");
+    EXPECT_EQ(Error(), "-109,\"Missing parameter\"");
+    EXPECT_THAT(Error(), HasSubstr("-224,\"Illegal parameter value;no arb named NOSUCH"));
+    EXPECT_EQ(Error(), "-222,\"Data out of range\"");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    EXPECT_EQ(emu_.Execute("FREQ?"), "+5.000000000000000E+03");
+    for (int i = 0; i < 30; ++i)
+        emu_.Execute("BOGUS");
+    std::string last;
+    for (int i = 0; i < 20; ++i)
+        last = Error();
+    EXPECT_EQ(last, "-350,\"Queue overflow\"");
+    emu_.Execute("*RST");
+    EXPECT_EQ(emu_.Execute("FREQ?;FUNC?;OUTP?"), "+1.000000000000000E+03;SIN;0");
+}
+
+TEST_F(EmulatorTest, BurstsWaitForTheBusTrigger) {
+    emu_.Execute("FUNC SQU;FREQ 1000;VOLT 2;:OUTP ON;:TRIG:SOUR BUS;:BURS:NCYC 2;BURS:STAT ON");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    EXPECT_EQ(emu_.Execute("BURS:STAT?;BURS:NCYC?;TRIG:SOUR?"), "1;+2.000000000000000E+00;BUS");
+    EXPECT_THAT(Render(1, 1e-4, 3), ElementsAre(0, 0, 0)) << "idle until triggered";
+    emu_.Execute("*TRG");
+    EXPECT_EQ(Error(), "+0,\"No error\"");
+    emu_.Execute("BURS:STAT OFF;*TRG");
+    EXPECT_EQ(Error(), "-211,\"Trigger ignored\"");
+}
+
+} // namespace
+} // namespace qzivi
