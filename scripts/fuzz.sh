@@ -10,7 +10,7 @@ CC=clang CXX=clang++ cmake -S . -B build/fuzz -G Ninja -DQZIVI_FUZZ=ON -DQZIVI_B
   -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
 cmake --build build/fuzz -j 2 >/dev/null
 export QZIVI_SESSION_MANAGER=none
-for target in bag qzc store numbers data_file; do
+for target in bag qzc store numbers data_file scpi; do
   work=$(mktemp -d)
   echo "== fuzz_$target: $runs runs"
   # The seeds are read, not written to: new finds go to a scratch folder.

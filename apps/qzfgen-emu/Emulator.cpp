@@ -162,8 +162,10 @@ void Emulator::Open() {
 }
 
 void Emulator::Reset() {
-    waveforms_.clear();
-    sequences_.clear();
+    for (auto& memory : waveforms_)
+        memory.clear();
+    for (auto& memory : sequences_)
+        memory.clear();
     for (auto& c : channels_)
         c = ChannelState();
     swapped_ = false;
@@ -215,15 +217,17 @@ void Emulator::ApplyFunction(int channel) {
     const std::size_t index = scpi::ParseChoice(Parameter{ParamKind::Text, c.function}, kFunctions);
     outputModeChannel_ = channel;
     if (kFunctions[index] == "ARB") {
-        const bool sequence = sequences_.count(c.arb) > 0;
+        auto& waveforms = waveforms_[channel - 1];
+        auto& sequences = sequences_[channel - 1];
+        const bool sequence = sequences.count(c.arb) > 0;
         Check(IviFgen_ConfigureOutputMode(vi_, sequence ? IVIFGEN_VAL_OUTPUT_SEQ
                                                         : IVIFGEN_VAL_OUTPUT_ARB));
         if (sequence)
             Check(IviFgen_SetAttributeViInt32(vi_, name.c_str(), IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE,
-                                              sequences_[c.arb]));
-        else if (waveforms_.count(c.arb) > 0)
+                                              sequences[c.arb]));
+        else if (waveforms.count(c.arb) > 0)
             Check(IviFgen_SetAttributeViInt32(vi_, name.c_str(), IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE,
-                                              waveforms_[c.arb]));
+                                              waveforms[c.arb]));
         return;
     }
     Check(IviFgen_ConfigureOutputMode(vi_, IVIFGEN_VAL_OUTPUT_FUNC));
@@ -327,6 +331,22 @@ std::vector<Emulator::Entry> Emulator::Table() {
              c.emu.swapped_ = scpi::ParseChoice(c.Param(0), {"NORMal", "SWAPped"}) == 1;
          },
          [](Call& c) { return std::string(c.emu.swapped_ ? "SWAP" : "NORM"); }});
+
+    add("ROSCillator:SOURce",
+        {"",
+         [](Call& c) {
+             c.Count(1);
+             const std::size_t i = scpi::ParseChoice(c.Param(0), {"INTernal", "EXTernal"});
+             c.SetInt(IVIFGEN_ATTR_REF_CLOCK_SOURCE,
+                      i == 0 ? IVIFGEN_VAL_REF_CLOCK_INTERNAL : IVIFGEN_VAL_REF_CLOCK_EXTERNAL,
+                      false);
+         },
+         [](Call& c) {
+             return std::string(c.Int(IVIFGEN_ATTR_REF_CLOCK_SOURCE, false) ==
+                                        IVIFGEN_VAL_REF_CLOCK_EXTERNAL
+                                    ? "EXT"
+                                    : "INT");
+         }});
 
     // ---- The function and its settings
     add("[SOURce#:]FUNCtion[:SHAPe]",
@@ -433,10 +453,16 @@ std::vector<Emulator::Entry> Emulator::Table() {
     add("[SOURce#:]DATA:VOLatile:CLEar",
         {"",
          [](Call& c) {
-             c.emu.Check(IviFgen_ClearArbSequence(c.emu.vi_, IVIFGEN_VAL_ALL_SEQUENCES));
-             c.emu.Check(IviFgen_ClearArbWaveform(c.emu.vi_, IVIFGEN_VAL_ALL_WAVEFORMS));
-             c.emu.waveforms_.clear();
-             c.emu.sequences_.clear();
+             // This channel's memory; the simulator's copies of its waveforms are let go.
+             auto& waveforms = c.emu.waveforms_[c.channel - 1];
+             auto& sequences = c.emu.sequences_[c.channel - 1];
+             for (const auto& [name, handle] : sequences)
+                 c.emu.Check(IviFgen_ClearArbSequence(c.emu.vi_, handle));
+             for (const auto& [name, handle] : waveforms)
+                 c.emu.Check(IviFgen_ClearArbWaveform(c.emu.vi_, handle));
+             waveforms.clear();
+             sequences.clear();
+             c.emu.channels_[c.channel - 1].arb.clear();
          },
          nullptr});
     auto upload = [](bool dac) {
@@ -462,12 +488,13 @@ std::vector<Emulator::Entry> Emulator::Table() {
             }
             for (double v : points)
                 if (!(v >= -1 && v <= 1)) throw Error{-222, "Data out of range"};
-            if (c.emu.waveforms_.count(name) > 0 || c.emu.sequences_.count(name) > 0)
+            auto& waveforms = c.emu.waveforms_[c.channel - 1];
+            if (waveforms.count(name) > 0 || c.emu.sequences_[c.channel - 1].count(name) > 0)
                 throw Error{-221, "Settings conflict;arb name already exists"};
             ViInt32 handle = 0;
             c.emu.Check(IviFgen_CreateArbWaveform(c.emu.vi_, static_cast<ViInt32>(points.size()),
                                                   points.data(), &handle));
-            c.emu.waveforms_[name] = handle;
+            waveforms[name] = handle;
         };
     };
     add("[SOURce#:]DATA:ARBitrary", {"", upload(false), nullptr});
@@ -487,8 +514,9 @@ std::vector<Emulator::Entry> Emulator::Table() {
              const std::string name = ArbName(p[0]);
              std::vector<ViInt32> handles, loops;
              for (std::size_t i = 1; i < p.size(); i += 5) {
-                 const auto found = c.emu.waveforms_.find(ArbName(p[i]));
-                 if (found == c.emu.waveforms_.end())
+                 const auto& waveforms = c.emu.waveforms_[c.channel - 1];
+                 const auto found = waveforms.find(ArbName(p[i]));
+                 if (found == waveforms.end())
                      throw Error{-224, "Illegal parameter value;no arb named " + p[i].value};
                  const std::size_t play = scpi::ParseChoice(
                      p[i + 2], {"once", "onceWaitTrig", "repeat", "repeatInf", "repeatTilTrig"});
@@ -498,12 +526,13 @@ std::vector<Emulator::Entry> Emulator::Table() {
                                  : play == 0 || play == 1 ? 1
                                                           : 1000000);
              }
-             if (c.emu.waveforms_.count(name) > 0 || c.emu.sequences_.count(name) > 0)
+             auto& sequences = c.emu.sequences_[c.channel - 1];
+             if (c.emu.waveforms_[c.channel - 1].count(name) > 0 || sequences.count(name) > 0)
                  throw Error{-221, "Settings conflict;arb name already exists"};
              ViInt32 handle = 0;
              c.emu.Check(IviFgen_CreateArbSequence(c.emu.vi_, static_cast<ViInt32>(handles.size()),
                                                    handles.data(), loops.data(), &handle));
-             c.emu.sequences_[name] = handle;
+             sequences[name] = handle;
          },
          nullptr});
     add("[SOURce#:]FUNCtion:ARBitrary",
@@ -511,7 +540,8 @@ std::vector<Emulator::Entry> Emulator::Table() {
          [](Call& c) {
              c.Count(1);
              const std::string name = ArbName(c.Param(0));
-             if (c.emu.waveforms_.count(name) == 0 && c.emu.sequences_.count(name) == 0)
+             if (c.emu.waveforms_[c.channel - 1].count(name) == 0 &&
+                 c.emu.sequences_[c.channel - 1].count(name) == 0)
                  throw Error{-224, "Illegal parameter value;no arb named " + c.Param(0).value};
              c.emu.channels_[c.channel - 1].arb = name;
              if (c.emu.channels_[c.channel - 1].function == "ARB") c.emu.ApplyFunction(c.channel);

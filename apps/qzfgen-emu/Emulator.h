@@ -60,8 +60,9 @@ private:
     ViSession vi_ = 0;
     std::vector<Entry> table_;
     std::deque<scpi::Error> errors_;
-    std::map<std::string, ViInt32> waveforms_; // by upper-case name
-    std::map<std::string, ViInt32> sequences_;
+    // Each channel's volatile memory, by upper-case name, as the series keeps one a channel.
+    std::map<std::string, ViInt32> waveforms_[2];
+    std::map<std::string, ViInt32> sequences_[2];
     ChannelState channels_[2];
     bool swapped_ = false; // FORMat:BORDer SWAPped: blocks least significant byte first
     int outputModeChannel_ = 1;

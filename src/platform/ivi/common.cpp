@@ -18,6 +18,11 @@ struct StatusEntry {
 constexpr StatusEntry kStatusTexts[] = {
     {IVI_ERROR_CANNOT_RECOVER, "Unrecoverable failure."},
     {IVI_ERROR_INSTRUMENT_STATUS, "Instrument error detected."},
+    {VI_ERROR_RSRC_NFOUND, "Insufficient location information or the requested device or resource "
+                           "is not present in the system."},
+    {VI_ERROR_TMO, "Timeout expired before operation completed."},
+    {VI_ERROR_IO, "Could not perform operation because of I/O error."},
+    {VI_ERROR_CONN_LOST, "The connection for the given session has been lost."},
     {IVI_ERROR_CANNOT_OPEN_FILE, "Cannot open file."},
     {IVI_ERROR_READING_FILE, "Error reading file."},
     {IVI_ERROR_INVALID_ATTRIBUTE, "Attribute ID not recognized."},

@@ -1,0 +1,712 @@
+#include "generator.h"
+
+#include "qzivi/ivi_common.h"
+
+#include <algorithm>
+#include <cmath>
+#include <cstdio>
+#include <cstring>
+
+namespace qzivi::scpi {
+
+using ivi::StatusError;
+
+namespace {
+
+constexpr Model kModels[] = {
+    {"33509B", 1, 20e6, 250e6, 1000000}, {"33510B", 2, 20e6, 250e6, 1000000},
+    {"33511B", 1, 20e6, 250e6, 1000000}, {"33512B", 2, 20e6, 250e6, 1000000},
+    {"33519B", 1, 30e6, 250e6, 1000000}, {"33520B", 2, 30e6, 250e6, 1000000},
+    {"33521A", 1, 30e6, 250e6, 1000000}, {"33521B", 1, 30e6, 250e6, 1000000},
+    {"33522A", 2, 30e6, 250e6, 1000000}, {"33522B", 2, 30e6, 250e6, 1000000},
+    {"33611A", 1, 80e6, 1e9, 4000000},   {"33612A", 2, 80e6, 1e9, 4000000},
+    {"33621A", 1, 120e6, 1e9, 4000000},  {"33622A", 2, 120e6, 1e9, 4000000},
+};
+
+constexpr std::size_t kMostReply = std::size_t{1} << 28;
+
+std::string Number(double value) {
+    char text[32];
+    std::snprintf(text, sizeof text, "%.15g", value);
+    return text;
+}
+
+const char* Shape(ViInt32 waveform) {
+    switch (waveform) {
+    case IVIFGEN_VAL_WFM_SQUARE:
+        return "SQU";
+    case IVIFGEN_VAL_WFM_TRIANGLE:
+        return "TRI";
+    case IVIFGEN_VAL_WFM_RAMP_UP:
+    case IVIFGEN_VAL_WFM_RAMP_DOWN:
+        return "RAMP";
+    case IVIFGEN_VAL_WFM_DC:
+        return "DC";
+    default:
+        return "SIN";
+    }
+}
+
+const char* ModulationShape(ViInt32 waveform) {
+    return waveform == IVIFGEN_VAL_WFM_RAMP_DOWN ? "NRAM" : Shape(waveform);
+}
+
+const char* AttrWord(ViAttr attr) {
+    switch (attr) {
+    case IVIFGEN_ATTR_OUTPUT_MODE:
+        return "IVIFGEN_ATTR_OUTPUT_MODE";
+    case IVIFGEN_ATTR_REF_CLOCK_SOURCE:
+        return "IVIFGEN_ATTR_REF_CLOCK_SOURCE";
+    case IVIFGEN_ATTR_OUTPUT_ENABLED:
+        return "IVIFGEN_ATTR_OUTPUT_ENABLED";
+    case IVIFGEN_ATTR_OUTPUT_IMPEDANCE:
+        return "IVIFGEN_ATTR_OUTPUT_IMPEDANCE";
+    case IVIFGEN_ATTR_OPERATION_MODE:
+        return "IVIFGEN_ATTR_OPERATION_MODE";
+    case IVIFGEN_ATTR_FUNC_WAVEFORM:
+        return "IVIFGEN_ATTR_FUNC_WAVEFORM";
+    case IVIFGEN_ATTR_FUNC_AMPLITUDE:
+        return "IVIFGEN_ATTR_FUNC_AMPLITUDE";
+    case IVIFGEN_ATTR_FUNC_DC_OFFSET:
+        return "IVIFGEN_ATTR_FUNC_DC_OFFSET";
+    case IVIFGEN_ATTR_FUNC_FREQUENCY:
+        return "IVIFGEN_ATTR_FUNC_FREQUENCY";
+    case IVIFGEN_ATTR_FUNC_START_PHASE:
+        return "IVIFGEN_ATTR_FUNC_START_PHASE";
+    case IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH:
+        return "IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH";
+    case IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE:
+        return "IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE";
+    case IVIFGEN_ATTR_ARB_GAIN:
+        return "IVIFGEN_ATTR_ARB_GAIN";
+    case IVIFGEN_ATTR_ARB_OFFSET:
+        return "IVIFGEN_ATTR_ARB_OFFSET";
+    case IVIFGEN_ATTR_ARB_SAMPLE_RATE:
+        return "IVIFGEN_ATTR_ARB_SAMPLE_RATE";
+    case IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE:
+        return "IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE";
+    case IVIFGEN_ATTR_TRIGGER_SOURCE:
+        return "IVIFGEN_ATTR_TRIGGER_SOURCE";
+    case IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE:
+        return "IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE";
+    case IVIFGEN_ATTR_BURST_COUNT:
+        return "IVIFGEN_ATTR_BURST_COUNT";
+    case IVIFGEN_ATTR_AM_ENABLED:
+        return "IVIFGEN_ATTR_AM_ENABLED";
+    case IVIFGEN_ATTR_AM_SOURCE:
+        return "IVIFGEN_ATTR_AM_SOURCE";
+    case IVIFGEN_ATTR_AM_INTERNAL_DEPTH:
+        return "IVIFGEN_ATTR_AM_INTERNAL_DEPTH";
+    case IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM:
+        return "IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM";
+    case IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY:
+        return "IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY";
+    case IVIFGEN_ATTR_FM_ENABLED:
+        return "IVIFGEN_ATTR_FM_ENABLED";
+    case IVIFGEN_ATTR_FM_SOURCE:
+        return "IVIFGEN_ATTR_FM_SOURCE";
+    case IVIFGEN_ATTR_FM_INTERNAL_DEVIATION:
+        return "IVIFGEN_ATTR_FM_INTERNAL_DEVIATION";
+    case IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM:
+        return "IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM";
+    case IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY:
+        return "IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY";
+    default:
+        return nullptr;
+    }
+}
+
+// The series' names of waveforms and sequences in volatile memory.
+std::string WaveformName(ViInt32 handle) {
+    return "QZW" + std::to_string(handle);
+}
+std::string SequenceName(ViInt32 handle) {
+    return "QZS" + std::to_string(handle);
+}
+
+} // namespace
+
+const Model* FindModel(std::string_view identity) {
+    const auto first = identity.find(',');
+    if (first == std::string_view::npos) return nullptr;
+    std::string_view model = identity.substr(first + 1);
+    model = ivi::Trim(model.substr(0, model.find(',')));
+    for (const Model& m : kModels)
+        if (ivi::EqualsNoCase(model, m.name)) return &m;
+    return nullptr;
+}
+
+Generator::Generator(const std::string& resource, std::chrono::milliseconds timeout, bool reset)
+    : transport_(Connect(ParseResource(resource), timeout)), resource_(resource) {
+    identity_ = Query("*IDN?");
+    model_ = FindModel(identity_);
+    if (model_ == nullptr)
+        throw StatusError(IVI_ERROR_INSTRUMENT_STATUS,
+                          "the instrument at " + resource + " is \"" + identity_ +
+                              "\", no generator of the 33500 or 33600 series this driver knows");
+    channels_.resize(static_cast<std::size_t>(model_->channels));
+    // The class's reset state on the instrument, sent whole; then the volatile memories are
+    // emptied, which the channels, back at standard waveforms, no longer play from.
+    Send(std::string(reset ? "*RST;" : "") + "*CLS;:FORM:BORD SWAP;:" + GlobalCommands());
+    for (int i = 0; i < model_->channels; ++i)
+        Send(ChannelCommands(i) + ";:SOUR" + std::to_string(i + 1) + ":DATA:VOL:CLE");
+}
+
+int Generator::Index(const std::string& channel) const {
+    for (int i = 0; i < model_->channels; ++i)
+        if (channel == std::to_string(i + 1)) return i;
+    if (channel.empty())
+        throw StatusError(IVI_ERROR_CHANNEL_NAME_REQUIRED, "a channel name is required");
+    throw StatusError(IVI_ERROR_UNKNOWN_CHANNEL_NAME,
+                      "channel \"" + channel + "\" is none of the " + model_->name + "'s");
+}
+
+std::string Generator::Query(const std::string& query) {
+    transport_->Write(query + "\n");
+    return transport_->ReadLine(kMostReply);
+}
+
+void Generator::Send(const std::string& commands) {
+    const std::string error = Query(commands + ";:SYST:ERR?");
+    if (error.rfind("+0,", 0) == 0 || error.rfind("0,", 0) == 0) return;
+    // Empty the queue, so the next call starts clean; the first entry is the cause.
+    for (int i = 0; i < 32 && Query("SYST:ERR?").find("No error") == std::string::npos; ++i) {
+    }
+    const int number = std::atoi(error.c_str());
+    throw StatusError(number == -222 || number == -224 ? IVI_ERROR_INVALID_VALUE
+                                                       : IVI_ERROR_INSTRUMENT_STATUS,
+                      "the instrument refused it: " + error);
+}
+
+std::string Generator::GlobalCommands() const {
+    const Global& g = global_;
+    return std::string("ROSC:SOUR ") +
+           (g.refClock == IVIFGEN_VAL_REF_CLOCK_EXTERNAL ? "EXT" : "INT");
+}
+
+std::string Generator::ChannelCommands(int index) const {
+    const Channel& c = channels_[static_cast<std::size_t>(index)];
+    const Global& g = global_;
+    const std::string n = std::to_string(index + 1), s = "SOUR" + n + ":";
+    std::string m = "OUTP" + n + ":LOAD " + Number(c.impedance);
+    if (g.outputMode == IVIFGEN_VAL_OUTPUT_FUNC) {
+        m += ";:" + s + "FUNC " + Shape(c.waveform);
+        if (c.waveform == IVIFGEN_VAL_WFM_RAMP_UP || c.waveform == IVIFGEN_VAL_WFM_RAMP_DOWN)
+            m += ";:" + s + "FUNC:RAMP:SYMM " +
+                 (c.waveform == IVIFGEN_VAL_WFM_RAMP_UP ? "100" : "0");
+        if (c.waveform == IVIFGEN_VAL_WFM_SQUARE)
+            m += ";:" + s + "FUNC:SQU:DCYC " + Number(c.dutyCycle);
+        m += ";:" + s + "FREQ " + Number(c.frequency) + ";:" + s + "VOLT " + Number(c.amplitude) +
+             ";:" + s + "VOLT:OFFS " + Number(c.offset) + ";:" + s + "PHAS " + Number(c.phase);
+    } else {
+        const bool sequence = g.outputMode == IVIFGEN_VAL_OUTPUT_SEQ;
+        const ViInt32 handle = sequence ? c.sequenceHandle : c.arbHandle;
+        if (handle != 0)
+            m += ";:" + s + "FUNC:ARB " + (sequence ? SequenceName(handle) : WaveformName(handle));
+        m += ";:" + s + "FUNC ARB;:" + s + "FUNC:ARB:SRAT " + Number(g.sampleRate) + ";:" + s +
+             "VOLT " + Number(2 * c.arbGain) + ";:" + s + "VOLT:OFFS " + Number(c.arbOffset);
+    }
+    const char* trigger = c.triggerSource == IVIFGEN_VAL_EXTERNAL        ? "EXT"
+                          : c.triggerSource == IVIFGEN_VAL_SOFTWARE_TRIG ? "BUS"
+                                                                         : "IMM";
+    m += ";:TRIG" + n + ":SOUR " + trigger + ";:" + s + "BURS:NCYC " +
+         std::to_string(c.burstCount) + ";:" + s + "BURS:INT:PER " + Number(1 / g.triggerRate) +
+         ";:" + s + "BURS:STAT " + (c.operationMode == IVIFGEN_VAL_OPERATE_BURST ? "ON" : "OFF");
+    m += ";:" + s + "AM:SOUR " + (c.amSource == IVIFGEN_VAL_AM_INTERNAL ? "INT" : "EXT") +
+         ";:" + s + "AM:DEPT " + Number(g.amDepth) + ";:" + s + "AM:INT:FUNC " +
+         ModulationShape(g.amWaveform) + ";:" + s + "AM:INT:FREQ " + Number(g.amFrequency) +
+         ";:" + s + "AM:STAT " + (c.am ? "ON" : "OFF");
+    m += ";:" + s + "FM:SOUR " + (c.fmSource == IVIFGEN_VAL_FM_INTERNAL ? "INT" : "EXT") +
+         ";:" + s + "FM:DEV " + Number(g.fmDeviation) + ";:" + s + "FM:INT:FUNC " +
+         ModulationShape(g.fmWaveform) + ";:" + s + "FM:INT:FREQ " + Number(g.fmFrequency) +
+         ";:" + s + "FM:STAT " + (c.fm ? "ON" : "OFF");
+    m += ";:OUTP" + n + " " + (generating_ && c.enabled ? "ON" : "OFF");
+    return m;
+}
+
+void Generator::Validate(const Global& g, const Channel& c) const {
+    auto refuse = [](const std::string& what) { throw StatusError(IVI_ERROR_INVALID_VALUE, what); };
+    if (g.outputMode < IVIFGEN_VAL_OUTPUT_FUNC || g.outputMode > IVIFGEN_VAL_OUTPUT_SEQ)
+        refuse("output mode " + std::to_string(g.outputMode) + " is none of the class's");
+    if (c.waveform < IVIFGEN_VAL_WFM_SINE || c.waveform > IVIFGEN_VAL_WFM_DC)
+        refuse("waveform " + std::to_string(c.waveform) + " is no standard waveform");
+    if (!(g.triggerRate > 0)) refuse("the internal trigger rate must be above 0");
+    if (c.triggerSource != IVIFGEN_VAL_EXTERNAL && c.triggerSource != IVIFGEN_VAL_SOFTWARE_TRIG &&
+        c.triggerSource != IVIFGEN_VAL_INTERNAL_TRIGGER)
+        throw StatusError(IVI_ERROR_VALUE_NOT_SUPPORTED, "trigger source " +
+                                                             std::to_string(c.triggerSource) +
+                                                             " is not on the " + model_->name);
+    if (c.arbHandle != 0 && waveforms_.count(c.arbHandle) == 0)
+        refuse("no waveform has the handle " + std::to_string(c.arbHandle));
+    if (c.sequenceHandle != 0 && sequences_.count(c.sequenceHandle) == 0)
+        refuse("no sequence has the handle " + std::to_string(c.sequenceHandle));
+}
+
+double Generator::Get(ViAttr attr, const std::string& channel) const {
+    const Global& g = global_;
+    switch (attr) {
+    case IVIFGEN_ATTR_OUTPUT_MODE:
+        return g.outputMode;
+    case IVIFGEN_ATTR_REF_CLOCK_SOURCE:
+        return g.refClock;
+    case IVIFGEN_ATTR_ARB_SAMPLE_RATE:
+        return g.sampleRate;
+    case IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE:
+        return g.triggerRate;
+    case IVIFGEN_ATTR_AM_INTERNAL_DEPTH:
+        return g.amDepth;
+    case IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM:
+        return g.amWaveform;
+    case IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY:
+        return g.amFrequency;
+    case IVIFGEN_ATTR_FM_INTERNAL_DEVIATION:
+        return g.fmDeviation;
+    case IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM:
+        return g.fmWaveform;
+    case IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY:
+        return g.fmFrequency;
+    case IVIFGEN_ATTR_MAX_NUM_WAVEFORMS:
+        return kMaxWaveforms;
+    case IVIFGEN_ATTR_WAVEFORM_QUANTUM:
+        return 1;
+    case IVIFGEN_ATTR_MIN_WAVEFORM_SIZE:
+        return 8;
+    case IVIFGEN_ATTR_MAX_WAVEFORM_SIZE:
+        return model_->maxPoints;
+    case IVIFGEN_ATTR_MAX_NUM_SEQUENCES:
+        return kMaxSequences;
+    case IVIFGEN_ATTR_MIN_SEQUENCE_LENGTH:
+        return 1;
+    case IVIFGEN_ATTR_MAX_SEQUENCE_LENGTH:
+        return kMaxSequenceLength;
+    case IVIFGEN_ATTR_MAX_LOOP_COUNT:
+        return kMaxLoopCount;
+    default:
+        break;
+    }
+    const Channel& c = channels_[static_cast<std::size_t>(Index(channel))];
+    switch (attr) {
+    case IVIFGEN_ATTR_OUTPUT_ENABLED:
+        return c.enabled;
+    case IVIFGEN_ATTR_OUTPUT_IMPEDANCE:
+        return c.impedance;
+    case IVIFGEN_ATTR_OPERATION_MODE:
+        return c.operationMode;
+    case IVIFGEN_ATTR_FUNC_WAVEFORM:
+        return c.waveform;
+    case IVIFGEN_ATTR_FUNC_AMPLITUDE:
+        return c.amplitude;
+    case IVIFGEN_ATTR_FUNC_DC_OFFSET:
+        return c.offset;
+    case IVIFGEN_ATTR_FUNC_FREQUENCY:
+        return c.frequency;
+    case IVIFGEN_ATTR_FUNC_START_PHASE:
+        return c.phase;
+    case IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH:
+        return c.dutyCycle;
+    case IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE:
+        return c.arbHandle;
+    case IVIFGEN_ATTR_ARB_GAIN:
+        return c.arbGain;
+    case IVIFGEN_ATTR_ARB_OFFSET:
+        return c.arbOffset;
+    case IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE:
+        return c.sequenceHandle;
+    case IVIFGEN_ATTR_TRIGGER_SOURCE:
+        return c.triggerSource;
+    case IVIFGEN_ATTR_BURST_COUNT:
+        return c.burstCount;
+    case IVIFGEN_ATTR_AM_ENABLED:
+        return c.am;
+    case IVIFGEN_ATTR_AM_SOURCE:
+        return c.amSource;
+    case IVIFGEN_ATTR_FM_ENABLED:
+        return c.fm;
+    case IVIFGEN_ATTR_FM_SOURCE:
+        return c.fmSource;
+    default:
+        throw StatusError(IVI_ERROR_ATTRIBUTE_NOT_SUPPORTED,
+                          "attribute " + std::to_string(attr) + " is not supported");
+    }
+}
+
+void Generator::Set(ViAttr attr, const std::string& channel, double value, bool checkOnly) {
+    const char* word = AttrWord(attr);
+    if (word == nullptr)
+        throw StatusError(IVI_ERROR_ATTRIBUTE_NOT_SUPPORTED, "attribute " + std::to_string(attr) +
+                                                                 " cannot be set on the " +
+                                                                 std::string(model_->name));
+    Global g = global_;
+    std::vector<Channel> channels = channels_;
+    bool global = true;
+    switch (attr) {
+    case IVIFGEN_ATTR_OUTPUT_MODE:
+        g.outputMode = static_cast<ViInt32>(value);
+        break;
+    case IVIFGEN_ATTR_REF_CLOCK_SOURCE:
+        g.refClock = static_cast<ViInt32>(value);
+        break;
+    case IVIFGEN_ATTR_ARB_SAMPLE_RATE:
+        g.sampleRate = value;
+        break;
+    case IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE:
+        g.triggerRate = value;
+        break;
+    case IVIFGEN_ATTR_AM_INTERNAL_DEPTH:
+        g.amDepth = value;
+        break;
+    case IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM:
+        g.amWaveform = static_cast<ViInt32>(value);
+        break;
+    case IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY:
+        g.amFrequency = value;
+        break;
+    case IVIFGEN_ATTR_FM_INTERNAL_DEVIATION:
+        g.fmDeviation = value;
+        break;
+    case IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM:
+        g.fmWaveform = static_cast<ViInt32>(value);
+        break;
+    case IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY:
+        g.fmFrequency = value;
+        break;
+    default: {
+        global = false;
+        Channel& c = channels[static_cast<std::size_t>(Index(channel))];
+        switch (attr) {
+        case IVIFGEN_ATTR_OUTPUT_ENABLED:
+            c.enabled = value != 0;
+            break;
+        case IVIFGEN_ATTR_OUTPUT_IMPEDANCE:
+            c.impedance = value;
+            break;
+        case IVIFGEN_ATTR_OPERATION_MODE:
+            c.operationMode = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_FUNC_WAVEFORM:
+            c.waveform = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_FUNC_AMPLITUDE:
+            c.amplitude = value;
+            break;
+        case IVIFGEN_ATTR_FUNC_DC_OFFSET:
+            c.offset = value;
+            break;
+        case IVIFGEN_ATTR_FUNC_FREQUENCY:
+            c.frequency = value;
+            break;
+        case IVIFGEN_ATTR_FUNC_START_PHASE:
+            c.phase = value;
+            break;
+        case IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH:
+            c.dutyCycle = value;
+            break;
+        case IVIFGEN_ATTR_ARB_WAVEFORM_HANDLE:
+            c.arbHandle = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_ARB_GAIN:
+            c.arbGain = value;
+            break;
+        case IVIFGEN_ATTR_ARB_OFFSET:
+            c.arbOffset = value;
+            break;
+        case IVIFGEN_ATTR_ARB_SEQUENCE_HANDLE:
+            c.sequenceHandle = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_TRIGGER_SOURCE:
+            c.triggerSource = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_BURST_COUNT:
+            c.burstCount = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_AM_ENABLED:
+            c.am = value != 0;
+            break;
+        case IVIFGEN_ATTR_AM_SOURCE:
+            c.amSource = static_cast<ViInt32>(value);
+            break;
+        case IVIFGEN_ATTR_FM_ENABLED:
+            c.fm = value != 0;
+            break;
+        case IVIFGEN_ATTR_FM_SOURCE:
+            c.fmSource = static_cast<ViInt32>(value);
+            break;
+        default:
+            break;
+        }
+    }
+    }
+    try {
+        for (const Channel& c : channels)
+            Validate(g, c);
+        if (checkOnly) return;
+        const Global oldGlobal = global_;
+        const std::vector<Channel> oldChannels = channels_;
+        global_ = g;
+        channels_ = channels;
+        try {
+            if (attr == IVIFGEN_ATTR_REF_CLOCK_SOURCE) Send(GlobalCommands());
+            for (int i = 0; i < model_->channels; ++i)
+                if (global || i == Index(channel)) Send(ChannelCommands(i));
+        } catch (...) {
+            global_ = oldGlobal;
+            channels_ = oldChannels;
+            throw;
+        }
+    } catch (const StatusError& e) {
+        throw StatusError(e.Status(), std::string(word) + ": " + Number(value) + ": " + e.what());
+    }
+}
+
+Generator::Range Generator::MinMax(ViAttr attr, const std::string& channel) const {
+    switch (attr) {
+    case IVIFGEN_ATTR_FUNC_FREQUENCY: {
+        const ViInt32 w = channels_[static_cast<std::size_t>(Index(channel))].waveform;
+        const bool slow = w == IVIFGEN_VAL_WFM_TRIANGLE || w == IVIFGEN_VAL_WFM_RAMP_UP ||
+                          w == IVIFGEN_VAL_WFM_RAMP_DOWN;
+        return {1e-6, slow ? 200e3 : model_->maxFrequency};
+    }
+    case IVIFGEN_ATTR_FUNC_AMPLITUDE:
+        return {1e-3, 10};
+    case IVIFGEN_ATTR_FUNC_DC_OFFSET:
+    case IVIFGEN_ATTR_ARB_OFFSET:
+        return {-5, 5};
+    case IVIFGEN_ATTR_ARB_GAIN:
+        return {0.5e-3, 5};
+    case IVIFGEN_ATTR_FUNC_START_PHASE:
+        return {-360, 360};
+    case IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH:
+        return {0.01, 99.99};
+    case IVIFGEN_ATTR_OUTPUT_IMPEDANCE:
+        return {1, 10e3};
+    case IVIFGEN_ATTR_ARB_SAMPLE_RATE:
+        return {1e-6, model_->maxSampleRate};
+    case IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE:
+        return {1.0 / 8000, 1e6};
+    case IVIFGEN_ATTR_AM_INTERNAL_DEPTH:
+        return {0, 120};
+    case IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY:
+    case IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY:
+        return {1e-6, model_->maxFrequency};
+    case IVIFGEN_ATTR_FM_INTERNAL_DEVIATION:
+        return {1e-6, model_->maxFrequency / 2};
+    default:
+        throw StatusError(IVI_ERROR_ATTRIBUTE_NOT_SUPPORTED,
+                          "attribute " + std::to_string(attr) + " has no range");
+    }
+}
+
+void Generator::ConfigureStandardWaveform(const std::string& channel, ViInt32 waveform,
+                                          double amplitude, double offset, double frequency,
+                                          double phase) {
+    Channel& c = channels_[static_cast<std::size_t>(Index(channel))];
+    const Channel old = c;
+    c.waveform = waveform, c.amplitude = amplitude, c.offset = offset, c.frequency = frequency,
+    c.phase = phase;
+    try {
+        Validate(global_, c);
+        Send(ChannelCommands(Index(channel)));
+    } catch (...) {
+        c = old;
+        throw;
+    }
+}
+
+ViInt32 Generator::CreateArbWaveform(ViInt32 size, const ViReal64* data) {
+    if (data == nullptr)
+        throw StatusError(IVI_ERROR_NULL_POINTER, "the waveform's points are a null pointer");
+    if (size < 8 || size > model_->maxPoints)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "CreateArbWaveform: waveform size " + std::to_string(size) +
+                              " is outside the range 8 to " + std::to_string(model_->maxPoints));
+    if (static_cast<ViInt32>(waveforms_.size()) >= kMaxWaveforms)
+        throw StatusError(IVIFGEN_ERROR_NO_WFMS_AVAILABLE,
+                          "all " + std::to_string(kMaxWaveforms) + " waveforms are in use");
+    for (ViInt32 i = 0; i < size; ++i)
+        if (!(data[i] >= -1 && data[i] <= 1))
+            throw StatusError(IVI_ERROR_INVALID_VALUE,
+                              "CreateArbWaveform: point " + std::to_string(i) + " (" +
+                                  Number(data[i]) + ") is outside -1 to 1");
+    // IEEE 488.2 definite-length block of 32-bit floats, least significant byte first.
+    std::string points(static_cast<std::size_t>(size) * 4, '\0');
+    for (ViInt32 i = 0; i < size; ++i) {
+        const float f = static_cast<float>(data[i]);
+        std::memcpy(&points[static_cast<std::size_t>(i) * 4], &f, 4);
+    }
+    const std::string length = std::to_string(points.size());
+    const ViInt32 handle = nextHandle_++;
+    const std::string block = "#" + std::to_string(length.size()) + length + points;
+    // Each channel has a memory of its own: the waveform goes to every one.
+    for (int i = 1; i <= model_->channels; ++i)
+        Send("SOUR" + std::to_string(i) + ":DATA:ARB " + WaveformName(handle) + "," + block);
+    waveforms_[handle] = size;
+    return handle;
+}
+
+void Generator::ClearArbWaveform(ViInt32 handle) {
+    if (handle == IVIFGEN_VAL_ALL_WAVEFORMS) {
+        for (const Channel& c : channels_)
+            if (generating_ && c.arbHandle != 0 && global_.outputMode == IVIFGEN_VAL_OUTPUT_ARB)
+                throw StatusError(IVIFGEN_ERROR_WFM_IN_USE, "a channel is generating a waveform");
+        for (int i = 1; i <= model_->channels; ++i)
+            Send("SOUR" + std::to_string(i) + ":DATA:VOL:CLE");
+        waveforms_.clear();
+        sequences_.clear();
+        for (Channel& c : channels_)
+            c.arbHandle = c.sequenceHandle = 0;
+        return;
+    }
+    if (waveforms_.count(handle) == 0)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "ClearArbWaveform: no waveform has the handle " + std::to_string(handle));
+    for (const auto& [h, steps] : sequences_)
+        if (std::find(steps.begin(), steps.end(), handle) != steps.end())
+            throw StatusError(IVIFGEN_ERROR_WFM_IN_USE, "sequence " + std::to_string(h) +
+                                                            " plays waveform " +
+                                                            std::to_string(handle));
+    for (const Channel& c : channels_)
+        if (c.arbHandle == handle && generating_)
+            throw StatusError(IVIFGEN_ERROR_WFM_IN_USE,
+                              "a channel is generating waveform " + std::to_string(handle));
+    // The series clears its volatile memory only whole; the name stays there unused.
+    waveforms_.erase(handle);
+    for (Channel& c : channels_)
+        if (c.arbHandle == handle) c.arbHandle = 0;
+}
+
+void Generator::ConfigureArb(const std::string& channel, ViInt32 handle, double gain, double offset,
+                             bool sequence) {
+    Channel& c = channels_[static_cast<std::size_t>(Index(channel))];
+    const Channel old = c;
+    (sequence ? c.sequenceHandle : c.arbHandle) = handle;
+    c.arbGain = gain, c.arbOffset = offset;
+    try {
+        if (handle == 0 || (sequence ? sequences_.count(handle) : waveforms_.count(handle)) == 0)
+            throw StatusError(IVI_ERROR_INVALID_VALUE,
+                              std::string(sequence ? "ConfigureArbSequence: no sequence"
+                                                   : "ConfigureArbWaveform: no waveform") +
+                                  " has the handle " + std::to_string(handle));
+        Validate(global_, c);
+        Send(ChannelCommands(Index(channel)));
+    } catch (...) {
+        c = old;
+        throw;
+    }
+}
+
+ViInt32 Generator::CreateArbSequence(ViInt32 length, const ViInt32* handles, const ViInt32* loops) {
+    if (handles == nullptr || loops == nullptr)
+        throw StatusError(IVI_ERROR_NULL_POINTER, "the sequence's steps are a null pointer");
+    if (length < 1 || length > kMaxSequenceLength)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "CreateArbSequence: length " + std::to_string(length) +
+                              " is outside the range 1 to " + std::to_string(kMaxSequenceLength));
+    if (static_cast<ViInt32>(sequences_.size()) >= kMaxSequences)
+        throw StatusError(IVIFGEN_ERROR_NO_SEQS_AVAILABLE,
+                          "all " + std::to_string(kMaxSequences) + " sequences are in use");
+    const ViInt32 handle = nextHandle_++;
+    std::string text = "\"" + SequenceName(handle) + "\"";
+    for (ViInt32 i = 0; i < length; ++i) {
+        if (waveforms_.count(handles[i]) == 0)
+            throw StatusError(IVI_ERROR_INVALID_VALUE,
+                              "CreateArbSequence: step " + std::to_string(i + 1) +
+                                  " names no waveform (handle " + std::to_string(handles[i]) + ")");
+        if (loops[i] < 1 || loops[i] > kMaxLoopCount)
+            throw StatusError(IVI_ERROR_INVALID_VALUE,
+                              "CreateArbSequence: loop count " + std::to_string(loops[i]) +
+                                  " is outside the range 1 to " + std::to_string(kMaxLoopCount));
+        text += ",\"" + WaveformName(handles[i]) + "\"," + std::to_string(loops[i]) +
+                (loops[i] == 1 ? ",once" : ",repeat") + ",maintain,4";
+    }
+    const std::string count = std::to_string(text.size());
+    for (int i = 1; i <= model_->channels; ++i)
+        Send("SOUR" + std::to_string(i) + ":DATA:SEQ #" + std::to_string(count.size()) + count +
+             text);
+    sequences_[handle] = std::vector<ViInt32>(handles, handles + length);
+    return handle;
+}
+
+void Generator::ClearArbSequence(ViInt32 handle) {
+    if (handle == IVIFGEN_VAL_ALL_SEQUENCES) {
+        sequences_.clear();
+        for (Channel& c : channels_)
+            c.sequenceHandle = 0;
+        return;
+    }
+    if (sequences_.count(handle) == 0)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "ClearArbSequence: no sequence has the handle " + std::to_string(handle));
+    for (const Channel& c : channels_)
+        if (c.sequenceHandle == handle && generating_)
+            throw StatusError(IVIFGEN_ERROR_SEQ_IN_USE,
+                              "a channel is generating sequence " + std::to_string(handle));
+    sequences_.erase(handle);
+    for (Channel& c : channels_)
+        if (c.sequenceHandle == handle) c.sequenceHandle = 0;
+}
+
+void Generator::SendSoftwareTrigger() {
+    bool waiting = false;
+    for (const Channel& c : channels_)
+        waiting = waiting || (c.operationMode == IVIFGEN_VAL_OPERATE_BURST &&
+                              c.triggerSource == IVIFGEN_VAL_SOFTWARE_TRIG);
+    if (!waiting)
+        throw StatusError(IVIFGEN_ERROR_TRIGGER_NOT_SOFTWARE,
+                          "no channel is in burst mode with the software trigger as its source");
+    if (!generating_)
+        throw StatusError(IVIFGEN_ERROR_NOT_GENERATING,
+                          "a trigger needs generation to be initiated first");
+    Send("*TRG");
+}
+
+void Generator::InitiateGeneration() {
+    if (generating_) return;
+    generating_ = true;
+    try {
+        for (int i = 0; i < model_->channels; ++i)
+            Send(ChannelCommands(i));
+    } catch (...) {
+        generating_ = false;
+        throw;
+    }
+}
+
+void Generator::AbortGeneration() {
+    generating_ = false;
+    std::string off;
+    for (int i = 1; i <= model_->channels; ++i)
+        off += (off.empty() ? "" : ";:") + std::string("OUTP") + std::to_string(i) + " OFF";
+    Send(off);
+}
+
+void Generator::Render(const std::string& channel, double start, double step, ViInt32 count,
+                       ViReal64* volts) {
+    if (count < 0)
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          "the count of samples " + std::to_string(count) + " is negative");
+    if (count > 0 && volts == nullptr)
+        throw StatusError(IVI_ERROR_NULL_POINTER, "the sample buffer is a null pointer");
+    if (count == 0) return;
+    // An instrument that does not know the query answers only the error queue's entry.
+    const std::string reply =
+        Query("SOUR" + std::to_string(Index(channel) + 1) + ":EMUL:REND? " + Number(start) + "," +
+              Number(step) + "," + std::to_string(count) + ";:SYST:ERR?");
+    const auto split = reply.rfind(';');
+    if (split == std::string::npos || reply.find("No error", split) == std::string::npos) {
+        Query("*CLS;*OPC?");
+        throw StatusError(IVI_ERROR_FUNCTION_NOT_SUPPORTED,
+                          "the " + std::string(model_->name) + " at " + resource_ +
+                              " cannot tell what its outputs carry");
+    }
+    const char* p = reply.c_str();
+    for (ViInt32 i = 0; i < count; ++i) {
+        char* end = nullptr;
+        volts[i] = std::strtod(p, &end);
+        if (end == p || (*end != ',' && *end != ';'))
+            throw StatusError(VI_ERROR_IO, "the instrument's samples are garbled at sample " +
+                                               std::to_string(i));
+        p = end + 1;
+    }
+}
+
+} // namespace qzivi::scpi

@@ -1,0 +1,251 @@
+// The control over the network: a logical name whose store entry names the SCPI driver and the
+// emulator on the loopback address. The saved examples render the same there as on the built-in
+// simulator, and a dead, silent or garbled instrument gives the system's error, never a hang.
+#include "platform/test_support.h"
+
+#include <gtest/gtest.h>
+
+#include <arpa/inet.h>
+#include <csignal>
+#include <cstdio>
+#include <fstream>
+#include <functional>
+#include <netinet/in.h>
+#include <sstream>
+#include <sys/socket.h>
+#include <sys/wait.h>
+#include <thread>
+#include <unistd.h>
+
+namespace {
+
+// The emulator in a child process, on a port of its choosing or the one given.
+class Emulator {
+public:
+    explicit Emulator(int port = 0) {
+        int out[2];
+        if (::pipe(out) != 0) throw std::runtime_error("pipe");
+        pid_ = ::fork();
+        if (pid_ == 0) {
+            ::dup2(out[1], 1);
+            ::close(out[0]);
+            const std::string p = std::to_string(port);
+            ::execl(QZFGEN_EMU_PATH, QZFGEN_EMU_PATH, "--port", p.c_str(), nullptr);
+            ::_exit(127);
+        }
+        ::close(out[1]);
+        char line[16] = {};
+        std::size_t got = 0;
+        while (got < sizeof line - 1 && ::read(out[0], line + got, 1) == 1 && line[got] != '\n')
+            ++got;
+        ::close(out[0]);
+        port_ = std::atoi(line);
+    }
+    ~Emulator() { Kill(); }
+    void Kill() {
+        if (pid_ <= 0) return;
+        ::kill(pid_, SIGKILL);
+        ::waitpid(pid_, nullptr, 0);
+        pid_ = 0;
+    }
+    int Port() const { return port_; }
+
+private:
+    pid_t pid_ = 0;
+    int port_ = 0;
+};
+
+// A listener on the loopback address that answers each line as `answer` says (nothing: silence).
+class FakeInstrument {
+public:
+    explicit FakeInstrument(std::function<std::string(const std::string&)> answer)
+        : answer_(std::move(answer)) {
+        fd_ = ::socket(AF_INET, SOCK_STREAM, 0);
+        sockaddr_in a{};
+        a.sin_family = AF_INET;
+        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        socklen_t length = sizeof a;
+        ::bind(fd_, reinterpret_cast<sockaddr*>(&a), sizeof a);
+        ::listen(fd_, 1);
+        ::getsockname(fd_, reinterpret_cast<sockaddr*>(&a), &length);
+        port_ = ntohs(a.sin_port);
+        thread_ = std::thread([this] {
+            const int client = ::accept(fd_, nullptr, nullptr);
+            std::string pending;
+            char bytes[4096];
+            ssize_t got;
+            while (client >= 0 && (got = ::recv(client, bytes, sizeof bytes, 0)) > 0) {
+                pending.append(bytes, static_cast<std::size_t>(got));
+                for (std::size_t end; (end = pending.find('\n')) != std::string::npos;) {
+                    const std::string reply = answer_(pending.substr(0, end));
+                    pending.erase(0, end + 1);
+                    if (!reply.empty()) ::send(client, reply.data(), reply.size(), MSG_NOSIGNAL);
+                }
+            }
+            if (client >= 0) ::close(client);
+        });
+    }
+    ~FakeInstrument() {
+        ::shutdown(fd_, SHUT_RDWR);
+        ::close(fd_);
+        thread_.join();
+    }
+    int Port() const { return port_; }
+
+private:
+    std::function<std::string(const std::string&)> answer_;
+    int fd_ = -1, port_ = 0;
+    std::thread thread_;
+};
+
+class NetworkTest : public ::testing::Test {
+protected:
+    NetworkTest() { ::setenv("QZIVI_SESSION_MANAGER", "none", 1); }
+
+    void UseInstrumentAt(int port, int timeoutMs = 2000) {
+        store_.UseStore(
+            std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
+            "\nprefix = QZScpiFgen\nresource = TCPIP0::127.0.0.1::" + std::to_string(port) +
+            "::SOCKET\noptions = DriverSetup=Timeout=" + std::to_string(timeoutMs) +
+            "\nchannel Channel1 = 1\nchannel Channel2 = 2\n");
+    }
+    // The samples `qzfgen render` writes, and its exit code.
+    std::pair<int, std::vector<double>>
+    Render(const std::string& example, const std::string& channel, const std::string& name) {
+        const std::string out = (store_.Dir() / "render.csv").string();
+        const int status =
+            std::system((std::string(QZFGEN_PATH) + " render " + QZIVI_SOURCE_DIR + "/examples/" +
+                         example + " --channel " + channel + " --points 2000 --name " + name +
+                         " --csv " + out + " 2>/dev/null")
+                            .c_str());
+        std::vector<double> volts;
+        std::ifstream in(out);
+        std::string line;
+        std::getline(in, line); // the heading
+        while (std::getline(in, line))
+            volts.push_back(std::stod(line.substr(line.find(',') + 1)));
+        std::filesystem::remove(out);
+        return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, volts};
+    }
+    static std::string LastError() {
+        ViStatus code = 0;
+        ViChar text[1024] = {};
+        IviFgen_GetError(VI_NULL, &code, sizeof text, text);
+        return text;
+    }
+
+    qzivi::test::StoreScope store_;
+};
+
+TEST_F(NetworkTest, EveryExampleRendersOverTheNetworkAsOnTheSimulator) {
+    Emulator emulator;
+    UseInstrumentAt(emulator.Port());
+    for (const char* example :
+         {"function.qzc", "arbitrary.qzc", "sequence.qzc", "two-channels.qzc"})
+        for (const char* channel : {"Channel1", "Channel2"}) {
+            SCOPED_TRACE(std::string(example) + " " + channel);
+            const auto [simulatedCode, simulated] = Render(example, channel, "SampleFGen");
+            const auto [networkCode, network] = Render(example, channel, "Bench");
+            ASSERT_EQ(simulatedCode, 0);
+            ASSERT_EQ(networkCode, 0);
+            ASSERT_EQ(network.size(), simulated.size());
+            double most = 0;
+            for (std::size_t i = 0; i < network.size(); ++i)
+                most = std::max(most, std::abs(network[i] - simulated[i]));
+            // Arbitrary points cross the network as 32-bit floats.
+            EXPECT_LT(most, 1e-6);
+        }
+}
+
+TEST_F(NetworkTest, ALostInstrumentIsAnErrorAndTheNextInitConnectsAgain) {
+    auto emulator = std::make_unique<Emulator>();
+    const int port = emulator->Port();
+    UseInstrumentAt(port);
+    ViSession vi = 0;
+    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
+              VI_SUCCESS)
+        << LastError();
+    ASSERT_EQ(IviFgen_ConfigureOutputEnabled(vi, "Channel1", VI_TRUE), VI_SUCCESS);
+    emulator->Kill();
+    const ViStatus lost = IviFgen_ConfigureOutputEnabled(vi, "Channel1", VI_FALSE);
+    EXPECT_TRUE(lost == VI_ERROR_CONN_LOST || lost == VI_ERROR_TMO) << std::hex << lost;
+    EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
+    EXPECT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
+              VI_ERROR_RSRC_NFOUND);
+    EXPECT_NE(LastError().find("cannot connect to 127.0.0.1:" + std::to_string(port)),
+              std::string::npos);
+    emulator = std::make_unique<Emulator>(port); // back on its port
+    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
+              VI_SUCCESS)
+        << LastError();
+    EXPECT_EQ(
+        IviFgen_ConfigureStandardWaveform(vi, "Channel2", IVIFGEN_VAL_WFM_SQUARE, 1, 0, 1e3, 0),
+        VI_SUCCESS);
+    EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
+}
+
+TEST_F(NetworkTest, SilentGarbledAndUnknownInstrumentsAreRefusedWithTheirCause) {
+    const std::string identity = "QZ,33522B,1,1\n";
+    const struct {
+        const char* what;
+        std::function<std::string(const std::string&)> answer;
+        ViStatus status;
+        const char* told;
+    } cases[] = {
+        {"silent", [](const std::string&) { return std::string(); }, VI_ERROR_TMO,
+         "no reply from 127.0.0.1"},
+        {"unknown", [](const std::string&) { return std::string("ACME,FG9000,7,1.0\n"); },
+         IVI_ERROR_INSTRUMENT_STATUS, "\"ACME,FG9000,7,1.0\", no generator"},
+        {"endless",
+         [&](const std::string& line) {
+             return line == "*IDN?" ? identity : std::string(300, 'x'); // no newline, ever
+         },
+         VI_ERROR_TMO, "no reply"},
+        {"refusing",
+         [&](const std::string& line) {
+             return line == "*IDN?" ? identity : std::string("-113,\"Undefined header\"\n");
+         },
+         IVI_ERROR_INSTRUMENT_STATUS, "-113,\"Undefined header\""},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        FakeInstrument fake(c.answer);
+        UseInstrumentAt(fake.Port(), 300);
+        ViSession vi = 0;
+        EXPECT_EQ(
+            IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
+            c.status);
+        EXPECT_NE(LastError().find(c.told), std::string::npos) << LastError();
+        EXPECT_EQ(vi, 0u);
+    }
+}
+
+TEST_F(NetworkTest, GarbledSamplesAndBadResourcesAreErrors) {
+    const std::string identity = "QZ,33522B,1,1\n";
+    FakeInstrument fake([&](const std::string& line) {
+        if (line == "*IDN?") return identity;
+        if (line.find("REND?") != std::string::npos) return std::string("0.5,zz;+0,\"No error\"\n");
+        return std::string("+0,\"No error\"\n");
+    });
+    UseInstrumentAt(fake.Port(), 300);
+    ViSession vi = 0;
+    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
+              VI_SUCCESS)
+        << LastError();
+    ViReal64 volts[2];
+    EXPECT_EQ(QZIvi_RenderOutput(vi, "Channel1", 0, 1e-6, 2, volts), VI_ERROR_IO);
+    EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
+    for (const char* resource :
+         {"TCPIP0::127.0.0.1::SOCKET", "GPIB0::7::INSTR", "TCPIP0::127.0.0.1::99999::SOCKET"}) {
+        store_.UseStore(std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
+                        "\nprefix = QZScpiFgen\nresource = " + resource + "\n");
+        EXPECT_EQ(
+            IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
+            VI_ERROR_RSRC_NFOUND)
+            << resource;
+        EXPECT_NE(LastError().find("is no resource of a network instrument"), std::string::npos)
+            << resource;
+    }
+}
+
+} // namespace
