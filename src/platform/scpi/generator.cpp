@@ -167,7 +167,15 @@ std::string Generator::Query(const std::string& query) {
 }
 
 void Generator::Send(const std::string& commands) {
-    const std::string error = Query(commands + ";:SYST:ERR?");
+    Send({commands});
+}
+
+void Generator::Send(std::initializer_list<std::string_view> parts) {
+    // Written piece by piece: a waveform's block goes out as it is, never copied into a message.
+    for (std::string_view part : parts)
+        transport_->Write(part);
+    transport_->Write(";:SYST:ERR?\n");
+    const std::string error = transport_->ReadLine(kMostReply);
     if (error.rfind("+0,", 0) == 0 || error.rfind("0,", 0) == 0) return;
     // Empty the queue, so the next call starts clean; the first entry is the cause.
     for (int i = 0; i < 32 && Query("SYST:ERR?").find("No error") == std::string::npos; ++i) {
@@ -535,10 +543,11 @@ ViInt32 Generator::CreateArbWaveform(ViInt32 size, const ViReal64* data) {
     }
     const std::string length = std::to_string(points.size());
     const ViInt32 handle = nextHandle_++;
-    const std::string block = "#" + std::to_string(length.size()) + length + points;
+    const std::string header = "#" + std::to_string(length.size()) + length;
     // Each channel has a memory of its own: the waveform goes to every one.
     for (int i = 1; i <= model_->channels; ++i)
-        Send("SOUR" + std::to_string(i) + ":DATA:ARB " + WaveformName(handle) + "," + block);
+        Send({"SOUR" + std::to_string(i) + ":DATA:ARB " + WaveformName(handle) + "," + header,
+              points});
     waveforms_[handle] = size;
     return handle;
 }

@@ -8,9 +8,11 @@
 #include "transport.h"
 
 #include <chrono>
+#include <initializer_list>
 #include <map>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace qzivi::scpi {
@@ -88,6 +90,7 @@ private:
     int Index(const std::string& channel) const;
     // Sends the commands, then reads the error queue: its first entry is thrown.
     void Send(const std::string& commands);
+    void Send(std::initializer_list<std::string_view> parts);
     std::string Query(const std::string& query);
     // Everything of one channel, as the state holds it.
     std::string ChannelCommands(int index) const;
