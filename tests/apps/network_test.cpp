@@ -2,6 +2,10 @@
 // emulator on the loopback address. The saved examples render the same there as on the built-in
 // simulator, and a dead, silent or garbled instrument gives the system's error, never a hang.
 #include "platform/test_support.h"
+#include "qzivi/control/QZIviFgen.h"
+#include "qzivi/model/Channels.h"
+#include "qzivi/model/QZIviFgenInternalConfig.h"
+#include "qzivi/support/failure.h"
 
 #include <gtest/gtest.h>
 
@@ -155,6 +159,94 @@ TEST_F(NetworkTest, EveryExampleRendersOverTheNetworkAsOnTheSimulator) {
             // Arbitrary points cross the network as 32-bit floats.
             EXPECT_LT(most, 1e-6);
         }
+}
+
+// One tree for both: AM on a sine, FM on a triangle in bursts of three on the internal trigger.
+struct Reported {
+    std::int32_t code = 0;
+    std::string source, description;
+};
+
+std::vector<double> ConfigureAndRender(const std::string& logicalName, double amplitude,
+                                       Reported* refused = nullptr) {
+    using namespace qzivi;
+    QZIviFgen fgen;
+    fgen.InitProperties();
+    auto connection = fgen.IviError.Connect(
+        [&](std::int32_t code, const std::string& source, const std::string& description) {
+            if (refused != nullptr) *refused = {code, source, description};
+        });
+    fgen.LogicalName(logicalName);
+    fgen.Extensions(qzivifgenStdFuncExt | qzivifgenTriggerExt | qzivifgenInternalTriggerExt |
+                    qzivifgenBurstExt | qzivifgenModulateAMExt | qzivifgenModulateFMExt);
+    fgen.Internal()->AMInternalDepth(60);
+    fgen.Internal()->AMInternalFrequency(250);
+    fgen.Internal()->FMInternalDeviation(300);
+    fgen.Internal()->FMInternalFrequency(100);
+    fgen.Internal()->InternalTriggerRate(400);
+    const auto sine = fgen.Channels()->Add("Channel1");
+    sine->FuncFrequency(2e3);
+    sine->FuncAmplitude(amplitude);
+    sine->AMEnabled(true);
+    const auto bursts = fgen.Channels()->Add("Channel2");
+    bursts->FuncWaveform(qzivifgenWaveformTriangle);
+    bursts->FuncFrequency(1e3);
+    bursts->FuncDCOffset(0.5);
+    bursts->OperationMode(qzivifgenOperateBurst);
+    bursts->TriggerSource(qzivifgenInternalTrigger);
+    bursts->BurstCount(3);
+    bursts->FMEnabled(true);
+    fgen.Init();
+    fgen.Configure();
+    fgen.Initiate();
+    std::vector<double> volts;
+    for (const char* channel : {"Channel1", "Channel2"})
+        for (double v : fgen.Engine().RenderOutput(channel, 0, 20e-6, 1000))
+            volts.push_back(v);
+    fgen.CloseSession();
+    return volts;
+}
+
+TEST_F(NetworkTest, TriggerBurstAMAndFMConfigureOverTheNetworkAsOnTheSimulator) {
+    Emulator emulator;
+    UseInstrumentAt(emulator.Port());
+    const auto simulated = ConfigureAndRender("SampleFGen", 2);
+    const auto network = ConfigureAndRender("Bench", 2);
+    ASSERT_EQ(simulated.size(), 2000u);
+    ASSERT_EQ(network.size(), simulated.size());
+    double most = 0, swing = 0;
+    for (std::size_t i = 0; i < network.size(); ++i) {
+        most = std::max(most, std::abs(network[i] - simulated[i]));
+        swing = std::max(swing, std::abs(simulated[i]));
+    }
+    EXPECT_LT(most, 1e-6);
+    EXPECT_GT(swing, 0.5) << "the outputs carry a signal";
+}
+
+// A value outside the model's range is refused by the driver's check, as by the simulator's;
+// one the instrument refuses comes back with the instrument's own words.
+TEST_F(NetworkTest, ARefusedValueIsReportedAsTheSimulatorReportsIt) {
+    Emulator emulator;
+    UseInstrumentAt(emulator.Port());
+    Reported simulated, network;
+    EXPECT_THROW(ConfigureAndRender("SampleFGen", 40, &simulated), qzivi::Failure);
+    EXPECT_THROW(ConfigureAndRender("Bench", 40, &network), qzivi::Failure);
+    EXPECT_EQ(network.code, simulated.code);
+    EXPECT_EQ(network.source, simulated.source);
+    EXPECT_NE(network.description.find("(FuncAmplitude)"), std::string::npos)
+        << network.description;
+
+    FakeInstrument refusing([](const std::string& line) {
+        if (line == "*IDN?") return std::string("QZ,33522B,1,1\n");
+        return std::string(line.find("VOLT 2") != std::string::npos
+                               ? "-222,\"Data out of range;amplitude clipped to 1 Vpp\"\n"
+                               : "+0,\"No error\"\n");
+    });
+    UseInstrumentAt(refusing.Port(), 300);
+    EXPECT_THROW(ConfigureAndRender("Bench", 2, &network), qzivi::Failure);
+    EXPECT_NE(network.description.find("-222,\"Data out of range;amplitude clipped to 1 Vpp\""),
+              std::string::npos)
+        << network.description;
 }
 
 TEST_F(NetworkTest, ALostInstrumentIsAnErrorAndTheNextInitConnectsAgain) {

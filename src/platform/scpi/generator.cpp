@@ -344,6 +344,12 @@ void Generator::Set(ViAttr attr, const std::string& channel, double value, bool 
         throw StatusError(IVI_ERROR_ATTRIBUTE_NOT_SUPPORTED, "attribute " + std::to_string(attr) +
                                                                  " cannot be set on the " +
                                                                  std::string(model_->name));
+    // The model's range first: a value no model of the series takes is refused here, named.
+    const Range range = HasRange(attr) ? MinMax(attr, channel) : Range{-HUGE_VAL, HUGE_VAL};
+    if (!(value >= range.min && value <= range.max))
+        throw StatusError(IVI_ERROR_INVALID_VALUE,
+                          std::string(word) + ": " + Number(value) + " is outside the range " +
+                              Number(range.min) + " to " + Number(range.max));
     Global g = global_;
     std::vector<Channel> channels = channels_;
     bool global = true;
@@ -463,6 +469,28 @@ void Generator::Set(ViAttr attr, const std::string& channel, double value, bool 
         }
     } catch (const StatusError& e) {
         throw StatusError(e.Status(), std::string(word) + ": " + Number(value) + ": " + e.what());
+    }
+}
+
+bool Generator::HasRange(ViAttr attr) {
+    switch (attr) {
+    case IVIFGEN_ATTR_FUNC_FREQUENCY:
+    case IVIFGEN_ATTR_FUNC_AMPLITUDE:
+    case IVIFGEN_ATTR_FUNC_DC_OFFSET:
+    case IVIFGEN_ATTR_ARB_OFFSET:
+    case IVIFGEN_ATTR_ARB_GAIN:
+    case IVIFGEN_ATTR_FUNC_START_PHASE:
+    case IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH:
+    case IVIFGEN_ATTR_OUTPUT_IMPEDANCE:
+    case IVIFGEN_ATTR_ARB_SAMPLE_RATE:
+    case IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE:
+    case IVIFGEN_ATTR_AM_INTERNAL_DEPTH:
+    case IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY:
+    case IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY:
+    case IVIFGEN_ATTR_FM_INTERNAL_DEVIATION:
+        return true;
+    default:
+        return false;
     }
 }
 

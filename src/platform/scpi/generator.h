@@ -44,6 +44,7 @@ public:
         double min, max;
     };
     Range MinMax(ViAttr attr, const std::string& channel) const;
+    static bool HasRange(ViAttr attr);
 
     void ConfigureStandardWaveform(const std::string& channel, ViInt32 waveform, double amplitude,
                                    double offset, double frequency, double phase);
