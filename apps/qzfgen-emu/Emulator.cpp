@@ -521,6 +521,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
                  const std::size_t play = scpi::ParseChoice(
                      p[i + 2], {"once", "onceWaitTrig", "repeat", "repeatInf", "repeatTilTrig"});
                  const double count = scpi::ParseNumber(p[i + 1], 1, 1e6, 1);
+                 if (!(count >= 0 && count <= 1e6)) throw Error{-222, "Data out of range"};
                  handles.push_back(found->second);
                  loops.push_back(play == 2 ? static_cast<ViInt32>(std::max(1.0, std::round(count)))
                                  : play == 0 || play == 1 ? 1

@@ -62,7 +62,9 @@ private:
 // A listener on the loopback address that answers each line as `answer` says (nothing: silence).
 class FakeInstrument {
 public:
-    explicit FakeInstrument(std::function<std::string(const std::string&)> answer)
+    // `hangUpAfter` bytes received, it closes the connection, as an instrument switched off.
+    explicit FakeInstrument(std::function<std::string(const std::string&)> answer,
+                            std::size_t hangUpAfter = SIZE_MAX)
         : answer_(std::move(answer)) {
         fd_ = ::socket(AF_INET, SOCK_STREAM, 0);
         sockaddr_in a{};
@@ -73,12 +75,14 @@ public:
         ::listen(fd_, 1);
         ::getsockname(fd_, reinterpret_cast<sockaddr*>(&a), &length);
         port_ = ntohs(a.sin_port);
-        thread_ = std::thread([this] {
+        thread_ = std::thread([this, hangUpAfter] {
             const int client = ::accept(fd_, nullptr, nullptr);
             std::string pending;
             char bytes[4096];
             ssize_t got;
+            std::size_t total = 0;
             while (client >= 0 && (got = ::recv(client, bytes, sizeof bytes, 0)) > 0) {
+                if ((total += static_cast<std::size_t>(got)) > hangUpAfter) break;
                 pending.append(bytes, static_cast<std::size_t>(got));
                 for (std::size_t end; (end = pending.find('\n')) != std::string::npos;) {
                     const std::string reply = answer_(pending.substr(0, end));
@@ -310,6 +314,49 @@ TEST_F(NetworkTest, SilentGarbledAndUnknownInstrumentsAreRefusedWithTheirCause) 
         EXPECT_NE(LastError().find(c.told), std::string::npos) << LastError();
         EXPECT_EQ(vi, 0u);
     }
+}
+
+// An instrument that dies in the middle of an upload: the call ends with the lost connection,
+// within the time-out, and the session closes cleanly.
+TEST_F(NetworkTest, AnInstrumentThatDiesMidCallEndsTheCallWithItsCause) {
+    FakeInstrument dying(
+        [](const std::string& line) {
+            return line == "*IDN?" ? std::string("QZ,33522B,1,1\n")
+                                   : std::string("+0,\"No error\"\n");
+        },
+        64 * 1024);
+    UseInstrumentAt(dying.Port(), 2000);
+    ViSession vi = 0;
+    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
+              VI_SUCCESS)
+        << LastError();
+    const std::vector<ViReal64> points(1000000, 0.5);
+    ViInt32 handle = 0;
+    const ViStatus status =
+        IviFgen_CreateArbWaveform(vi, static_cast<ViInt32>(points.size()), points.data(), &handle);
+    EXPECT_TRUE(status == VI_ERROR_CONN_LOST || status == VI_ERROR_TMO) << std::hex << status;
+    EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
+}
+
+// A client that sends a block claiming more bytes than come, and goes: the emulator drops it and
+// serves the next connection, where the control configures as before.
+TEST_F(NetworkTest, AMalformedBlockLeavesTheEmulatorServing) {
+    Emulator emulator;
+    UseInstrumentAt(emulator.Port());
+    {
+        const int fd = ::socket(AF_INET, SOCK_STREAM, 0);
+        sockaddr_in a{};
+        a.sin_family = AF_INET;
+        a.sin_port = htons(static_cast<std::uint16_t>(emulator.Port()));
+        a.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+        ASSERT_EQ(::connect(fd, reinterpret_cast<sockaddr*>(&a), sizeof a), 0);
+        const std::string lying = "DATA:ARB BAD,#9100000000\x01\x02\x03\n*IDN?\n";
+        ASSERT_EQ(::send(fd, lying.data(), lying.size(), 0), static_cast<ssize_t>(lying.size()));
+        ::close(fd);
+    }
+    const auto [code, volts] = Render("function.qzc", "Channel1", "Bench");
+    EXPECT_EQ(code, 0);
+    EXPECT_EQ(volts.size(), 2000u);
 }
 
 TEST_F(NetworkTest, GarbledSamplesAndBadResourcesAreErrors) {
