@@ -13,6 +13,7 @@ namespace {
 using qzivi::ivi::CEntry;
 using qzivi::ivi::CopyText;
 using qzivi::ivi::ErrorRecord;
+using qzivi::ivi::Out;
 using qzivi::ivi::SessionTable;
 using qzivi::ivi::StatusError;
 using qzivi::scpi::Generator;
@@ -32,17 +33,10 @@ struct Session {
 SessionTable<Session> g_sessions(0x7100);
 thread_local ErrorRecord t_record;
 
-ViStatus InvalidSession(ViSession vi, const char* function) {
-    return CEntry(function, t_record, [&]() -> ViStatus {
-        throw StatusError(IVI_ERROR_INVALID_SESSION_HANDLE,
-                          std::to_string(vi) + " is not a session of this driver");
-    });
-}
-
 template <typename Body>
 ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
     Session* s = g_sessions.Find(vi);
-    if (s == nullptr) return InvalidSession(vi, function);
+    if (s == nullptr) return qzivi::ivi::InvalidSession(t_record, vi, function);
     return CEntry(function, s->record, [&]() -> ViStatus {
         std::lock_guard lock(s->mutex);
         try {
@@ -52,13 +46,6 @@ ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
         }
         return VI_SUCCESS;
     });
-}
-
-template <typename T>
-void Out(T* pointer, T value) {
-    if (pointer == nullptr)
-        throw StatusError(IVI_ERROR_NULL_POINTER, "an output parameter is a null pointer");
-    *pointer = value;
 }
 
 std::string Channel(ViConstString channel) {
@@ -125,28 +112,19 @@ ViStatus QZScpiFgen_InitWithOptions(ViRsrc resource, ViBoolean idQuery, ViBoolea
 ViStatus QZScpiFgen_close(ViSession vi) {
     return CEntry("close", t_record, [&]() -> ViStatus {
         const std::unique_ptr<Session> session = g_sessions.Remove(vi);
-        if (!session) return InvalidSession(vi, "close");
+        if (!session) return qzivi::ivi::InvalidSession(t_record, vi, "close");
         return VI_SUCCESS; // the connection closes with the session, whatever the instrument does
     });
 }
 
 ViStatus QZScpiFgen_error_message(ViSession vi, ViStatus status, ViChar message[]) {
     (void)vi;
-    return CEntry("error_message", t_record, [&]() -> ViStatus {
-        if (message == nullptr) throw StatusError(IVI_ERROR_NULL_POINTER, "message is null");
-        qzivi::ivi::StatusMessage(status, message);
-        return VI_SUCCESS;
-    });
+    return qzivi::ivi::ErrorMessage(t_record, status, message);
 }
 
 ViStatus QZScpiFgen_GetError(ViSession vi, ViStatus* code, ViInt32 bufferSize,
                              ViChar description[]) {
-    Session* s = g_sessions.Find(vi);
-    if (s == nullptr) return t_record.Report(code, bufferSize, description);
-    return CEntry("GetError", s->record, [&] {
-        std::lock_guard lock(s->mutex);
-        return s->record.Report(code, bufferSize, description);
-    });
+    return g_sessions.Report(vi, t_record, code, bufferSize, description);
 }
 
 ViStatus QZScpiFgen_GetAttributeViInt32(ViSession vi, ViConstString channel, ViAttr attr,

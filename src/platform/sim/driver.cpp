@@ -17,6 +17,7 @@ namespace {
 using qzivi::ivi::CEntry;
 using qzivi::ivi::CopyText;
 using qzivi::ivi::ErrorRecord;
+using qzivi::ivi::Out;
 using qzivi::ivi::SessionTable;
 using qzivi::ivi::StatusError;
 using qzivi::sim::AttrValue;
@@ -46,19 +47,12 @@ thread_local ErrorRecord t_record;
 // What the Throw fault throws: a type no handler of this project knows.
 struct InjectedThrow {};
 
-ViStatus InvalidSession(ViSession vi, const char* function) {
-    return CEntry(function, t_record, [&]() -> ViStatus {
-        throw StatusError(IVI_ERROR_INVALID_SESSION_HANDLE,
-                          std::to_string(vi) + " is not a session of this driver");
-    });
-}
-
 // Runs one call on a session: injected faults first, then the body; whatever it throws becomes
 // the call's status and the session's elaboration.
 template <typename Body>
 ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
     Session* s = g_sessions.Find(vi);
-    if (s == nullptr) return InvalidSession(vi, function);
+    if (s == nullptr) return qzivi::ivi::InvalidSession(t_record, vi, function);
     return CEntry(function, s->record, [&]() -> ViStatus {
         std::lock_guard lock(s->mutex);
         Faults& faults = s->instrument.ActiveFaults();
@@ -75,13 +69,6 @@ ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
             }
         return VI_SUCCESS;
     });
-}
-
-template <typename T>
-void Out(T* pointer, T value) {
-    if (pointer == nullptr)
-        throw StatusError(IVI_ERROR_NULL_POINTER, "an output parameter is a null pointer");
-    *pointer = value;
 }
 
 Faults ParseInitOptions(ViConstString optionString, std::string& driverSetup) {
@@ -146,7 +133,7 @@ ViStatus QZSimFgen_InitWithOptions(ViRsrc resource, ViBoolean idQuery, ViBoolean
 ViStatus QZSimFgen_close(ViSession vi) {
     return CEntry("close", t_record, [&]() -> ViStatus {
         const std::unique_ptr<Session> session = g_sessions.Remove(vi);
-        if (!session) return InvalidSession(vi, "close");
+        if (!session) return qzivi::ivi::InvalidSession(t_record, vi, "close");
         // The session is gone whatever the instrument answers; an injected failure still reports.
         if (const ViStatus injected = session->instrument.ActiveFaults().Failure("close"))
             throw StatusError(injected, "failure injected by DriverSetup");
@@ -156,21 +143,12 @@ ViStatus QZSimFgen_close(ViSession vi) {
 
 ViStatus QZSimFgen_error_message(ViSession vi, ViStatus status, ViChar message[]) {
     (void)vi;
-    return CEntry("error_message", t_record, [&]() -> ViStatus {
-        if (message == nullptr) throw StatusError(IVI_ERROR_NULL_POINTER, "message is null");
-        qzivi::ivi::StatusMessage(status, message);
-        return VI_SUCCESS;
-    });
+    return qzivi::ivi::ErrorMessage(t_record, status, message);
 }
 
 ViStatus QZSimFgen_GetError(ViSession vi, ViStatus* code, ViInt32 bufferSize,
                             ViChar description[]) {
-    Session* s = g_sessions.Find(vi);
-    if (s == nullptr) return t_record.Report(code, bufferSize, description);
-    return CEntry("GetError", s->record, [&] {
-        std::lock_guard lock(s->mutex);
-        return s->record.Report(code, bufferSize, description);
-    });
+    return g_sessions.Report(vi, t_record, code, bufferSize, description);
 }
 
 ViStatus QZSimFgen_GetAttributeViInt32(ViSession vi, ViConstString channel, ViAttr attr,

@@ -50,6 +50,31 @@ ViStatus CEntry(const char* function, ErrorRecord& record, Body&& body) noexcept
     }
 }
 
+// An output parameter of an entry; a null pointer is the caller's error.
+template <typename T>
+void Out(T* pointer, T value) {
+    if (pointer == nullptr)
+        throw StatusError(IVI_ERROR_NULL_POINTER, "an output parameter is a null pointer");
+    *pointer = value;
+}
+
+// A session number that is none of the driver's, kept in `record` with the function's name.
+inline ViStatus InvalidSession(ErrorRecord& record, ViSession vi, const char* function) noexcept {
+    return CEntry(function, record, [&]() -> ViStatus {
+        throw StatusError(IVI_ERROR_INVALID_SESSION_HANDLE,
+                          std::to_string(vi) + " is not a session of this driver");
+    });
+}
+
+// Every driver's error_message: the class's text of a status.
+inline ViStatus ErrorMessage(ErrorRecord& record, ViStatus status, ViChar message[]) noexcept {
+    return CEntry("error_message", record, [&]() -> ViStatus {
+        if (message == nullptr) throw StatusError(IVI_ERROR_NULL_POINTER, "message is null");
+        StatusMessage(status, message);
+        return VI_SUCCESS;
+    });
+}
+
 // The open sessions of one driver, numbered from `first`: lookups are lock-free, opening and
 // closing take the table's lock. A number of another driver falls outside the range.
 template <typename Session, std::size_t Slots = 256>
@@ -91,6 +116,17 @@ public:
             if (Session* s = slot.load(std::memory_order_acquire); s != nullptr && match(*s))
                 return s;
         return nullptr;
+    }
+
+    // Every driver's GetError: the session's record, or `orphans` for a number of no session.
+    ViStatus Report(ViSession vi, ErrorRecord& orphans, ViStatus* code, ViInt32 bufferSize,
+                    ViChar description[]) noexcept {
+        Session* s = Find(vi);
+        if (s == nullptr) return orphans.Report(code, bufferSize, description);
+        return CEntry("GetError", s->record, [&] {
+            std::lock_guard lock(s->mutex);
+            return s->record.Report(code, bufferSize, description);
+        });
     }
 
 private:
