@@ -62,6 +62,8 @@ private:
 // A listener on the loopback address that answers each line as `answer` says (nothing: silence).
 class FakeInstrument {
 public:
+    static constexpr const char* kTrickle = "\x01trickle";
+
     // `hangUpAfter` bytes received, it closes the connection, as an instrument switched off.
     explicit FakeInstrument(std::function<std::string(const std::string&)> answer,
                             std::size_t hangUpAfter = SIZE_MAX)
@@ -87,7 +89,11 @@ public:
                 for (std::size_t end; (end = pending.find('\n')) != std::string::npos;) {
                     const std::string reply = answer_(pending.substr(0, end));
                     pending.erase(0, end + 1);
-                    if (!reply.empty()) ::send(client, reply.data(), reply.size(), MSG_NOSIGNAL);
+                    if (reply == kTrickle) // a byte now and then, never a whole reply
+                        while (::send(client, "x", 1, MSG_NOSIGNAL) == 1)
+                            std::this_thread::sleep_for(std::chrono::milliseconds(50));
+                    else if (!reply.empty())
+                        ::send(client, reply.data(), reply.size(), MSG_NOSIGNAL);
                 }
             }
             if (client >= 0) ::close(client);
@@ -292,6 +298,11 @@ TEST_F(NetworkTest, SilentGarbledAndUnknownInstrumentsAreRefusedWithTheirCause) 
          "no reply from 127.0.0.1"},
         {"unknown", [](const std::string&) { return std::string("ACME,FG9000,7,1.0\n"); },
          IVI_ERROR_INSTRUMENT_STATUS, "\"ACME,FG9000,7,1.0\", no generator"},
+        {"trickling",
+         [&](const std::string& line) {
+             return line == "*IDN?" ? identity : std::string(FakeInstrument::kTrickle);
+         },
+         VI_ERROR_TMO, "no reply"},
         {"endless",
          [&](const std::string& line) {
              return line == "*IDN?" ? identity : std::string(300, 'x'); // no newline, ever

@@ -57,7 +57,7 @@ public:
                                     a->ai_protocol);
             if (fd < 0) continue;
             if (::connect(fd, a->ai_addr, a->ai_addrlen) == 0 ||
-                (errno == EINPROGRESS && Wait(fd, POLLOUT))) {
+                (errno == EINPROGRESS && Wait(fd, POLLOUT, Clock::now() + timeout_))) {
                 int error = 0;
                 socklen_t length = sizeof error;
                 ::getsockopt(fd, SOL_SOCKET, SO_ERROR, &error, &length);
@@ -80,6 +80,7 @@ public:
     ~Socket() override { ::close(fd_); }
 
     void Write(std::string_view bytes) override {
+        const auto deadline = Clock::now() + timeout_;
         while (!bytes.empty()) {
             const ssize_t put = ::send(fd_, bytes.data(), bytes.size(), MSG_NOSIGNAL);
             if (put > 0) {
@@ -88,7 +89,7 @@ public:
             }
             if (put < 0 && errno == EINTR) continue;
             if (put < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
-                if (!Wait(fd_, POLLOUT))
+                if (!Wait(fd_, POLLOUT, deadline))
                     throw StatusError(VI_ERROR_TMO, "writing to " + where_ + " timed out");
                 continue;
             }
@@ -97,7 +98,9 @@ public:
         }
     }
 
+    // The time-out bounds the whole reply, however slowly its bytes trickle in.
     std::string ReadLine(std::size_t most) override {
+        const auto deadline = Clock::now() + timeout_;
         for (;;) {
             if (const auto end = pending_.find('\n'); end != std::string::npos) {
                 std::string line = pending_.substr(0, end);
@@ -108,7 +111,7 @@ public:
             if (pending_.size() > most)
                 throw StatusError(VI_ERROR_IO, "the reply of " + where_ + " runs past " +
                                                    std::to_string(most) + " bytes without an end");
-            if (!Wait(fd_, POLLIN))
+            if (!Wait(fd_, POLLIN, deadline))
                 throw StatusError(VI_ERROR_TMO, "no reply from " + where_ + " within " +
                                                     std::to_string(timeout_.count()) + " ms");
             char bytes[1 << 16];
@@ -125,10 +128,15 @@ public:
     }
 
 private:
-    bool Wait(int fd, short events) const {
+    using Clock = std::chrono::steady_clock;
+
+    // Whether `fd` is ready before `deadline`.
+    static bool Wait(int fd, short events, Clock::time_point deadline) {
         pollfd p{fd, events, 0};
         for (;;) {
-            const int n = ::poll(&p, 1, static_cast<int>(timeout_.count()));
+            const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now());
+            if (left.count() <= 0) return false;
+            const int n = ::poll(&p, 1, static_cast<int>(left.count()));
             if (n < 0 && errno == EINTR) continue;
             errno = 0;
             return n > 0;
