@@ -13,6 +13,8 @@ echo "package: $deb"
 files=$(dpkg-deb --contents "$deb" | awk '{print $6}' | sed 's|^\./|/|' | grep -v '/$')
 $sudo dpkg -i "$deb" >/dev/null
 QZIVI_SESSION_MANAGER=none qzfgen configure /usr/share/qzivifgen/examples/two-channels.qzc
+qzfgen-emu --help >/dev/null
+[ -n "$(find /usr/lib -name libqzscpifgen.so)" ]
 [ -f /usr/lib/pkgconfig/qzivifgen.pc ] || [ -n "$(find /usr/lib -name qzivifgen.pc)" ]
 $sudo dpkg -r qzivifgen >/dev/null
 left=0
