@@ -396,6 +396,15 @@ TEST_F(NetworkTest, GarbledSamplesAndBadResourcesAreErrors) {
         EXPECT_NE(LastError().find("is no resource of a network instrument"), std::string::npos)
             << resource;
     }
+    // VXI-11 on a host where no instrument listens: refused with the transport's words.
+    store_.UseStore(std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
+                    "\nprefix = QZScpiFgen\nresource = TCPIP0::127.0.0.1::inst0::INSTR\n"
+                    "options = DriverSetup=Timeout=500\n");
+    EXPECT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
+              VI_ERROR_RSRC_NFOUND);
+    EXPECT_NE(LastError().find("cannot reach the VXI-11 device 127.0.0.1 (inst0)"),
+              std::string::npos)
+        << LastError();
 }
 
 } // namespace

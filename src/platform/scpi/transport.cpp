@@ -36,44 +36,67 @@ bool StartsNoCase(std::string_view text, std::string_view prefix) {
     return text.size() >= prefix.size() && ivi::EqualsNoCase(text.substr(0, prefix.size()), prefix);
 }
 
+using Clock = std::chrono::steady_clock;
+
+// Whether `fd` is ready before `deadline`.
+bool Wait(int fd, short events, Clock::time_point deadline) {
+    pollfd p{fd, events, 0};
+    for (;;) {
+        const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now());
+        if (left.count() <= 0) return false;
+        const int n = ::poll(&p, 1, static_cast<int>(left.count()));
+        if (n < 0 && errno == EINTR) continue;
+        errno = 0;
+        return n > 0;
+    }
+}
+
+// A TCP connection to host:port made before `deadline`, non-blocking; throws
+// StatusError(VI_ERROR_RSRC_NFOUND) with the reason.
+int ConnectTcp(const std::string& host, int port, Clock::time_point deadline) {
+    const std::string where = host + ":" + std::to_string(port);
+    addrinfo hints{};
+    hints.ai_family = AF_UNSPEC;
+    hints.ai_socktype = SOCK_STREAM;
+    addrinfo* found = nullptr;
+    if (const int error = ::getaddrinfo(host.c_str(), std::to_string(port).c_str(), &hints, &found);
+        error != 0)
+        throw StatusError(VI_ERROR_RSRC_NFOUND,
+                          "the host \"" + host + "\" is not known: " + ::gai_strerror(error));
+    std::string why = "no address";
+    int connected = -1;
+    for (addrinfo* a = found; a != nullptr && connected < 0; a = a->ai_next) {
+        const int fd =
+            ::socket(a->ai_family, a->ai_socktype | SOCK_CLOEXEC | SOCK_NONBLOCK, a->ai_protocol);
+        if (fd < 0) continue;
+        if (::connect(fd, a->ai_addr, a->ai_addrlen) == 0 ||
+            (errno == EINPROGRESS && Wait(fd, POLLOUT, deadline))) {
+            int error = 0;
+            socklen_t length = sizeof error;
+            ::getsockopt(fd, SOL_SOCKET, SO_ERROR, &error, &length);
+            if (error == 0) {
+                connected = fd;
+                break;
+            }
+            why = std::strerror(error);
+        } else {
+            why = errno == 0 ? "no answer within the time-out" : std::strerror(errno);
+        }
+        ::close(fd);
+    }
+    ::freeaddrinfo(found);
+    if (connected < 0)
+        throw StatusError(VI_ERROR_RSRC_NFOUND, "cannot connect to " + where + ": " + why);
+    return connected;
+}
+
 // ---- Raw SCPI over TCP --------------------------------------------------------------------------
 
 class Socket final : public Transport {
 public:
     Socket(const Resource& r, std::chrono::milliseconds timeout)
-        : timeout_(timeout), where_(r.host + ":" + std::to_string(r.port)) {
-        addrinfo hints{};
-        hints.ai_family = AF_UNSPEC;
-        hints.ai_socktype = SOCK_STREAM;
-        addrinfo* found = nullptr;
-        if (const int error =
-                ::getaddrinfo(r.host.c_str(), std::to_string(r.port).c_str(), &hints, &found);
-            error != 0)
-            throw StatusError(VI_ERROR_RSRC_NFOUND,
-                              "the host \"" + r.host + "\" is not known: " + ::gai_strerror(error));
-        std::string why = "no address";
-        for (addrinfo* a = found; a != nullptr && fd_ < 0; a = a->ai_next) {
-            const int fd = ::socket(a->ai_family, a->ai_socktype | SOCK_CLOEXEC | SOCK_NONBLOCK,
-                                    a->ai_protocol);
-            if (fd < 0) continue;
-            if (::connect(fd, a->ai_addr, a->ai_addrlen) == 0 ||
-                (errno == EINPROGRESS && Wait(fd, POLLOUT, Clock::now() + timeout_))) {
-                int error = 0;
-                socklen_t length = sizeof error;
-                ::getsockopt(fd, SOL_SOCKET, SO_ERROR, &error, &length);
-                if (error == 0) {
-                    fd_ = fd;
-                    break;
-                }
-                why = std::strerror(error);
-            } else {
-                why = errno == 0 ? "no answer within the time-out" : std::strerror(errno);
-            }
-            ::close(fd);
-        }
-        ::freeaddrinfo(found);
-        if (fd_ < 0)
-            throw StatusError(VI_ERROR_RSRC_NFOUND, "cannot connect to " + where_ + ": " + why);
+        : fd_(ConnectTcp(r.host, r.port, Clock::now() + timeout)), timeout_(timeout),
+          where_(r.host + ":" + std::to_string(r.port)) {
         const int yes = 1;
         ::setsockopt(fd_, IPPROTO_TCP, TCP_NODELAY, &yes, sizeof yes);
     }
@@ -128,22 +151,7 @@ public:
     }
 
 private:
-    using Clock = std::chrono::steady_clock;
-
-    // Whether `fd` is ready before `deadline`.
-    static bool Wait(int fd, short events, Clock::time_point deadline) {
-        pollfd p{fd, events, 0};
-        for (;;) {
-            const auto left = std::chrono::ceil<std::chrono::milliseconds>(deadline - Clock::now());
-            if (left.count() <= 0) return false;
-            const int n = ::poll(&p, 1, static_cast<int>(left.count()));
-            if (n < 0 && errno == EINTR) continue;
-            errno = 0;
-            return n > 0;
-        }
-    }
-
-    int fd_ = -1;
+    int fd_;
     std::chrono::milliseconds timeout_;
     std::string where_;
     std::string pending_;
@@ -153,8 +161,19 @@ private:
 
 class Vxi11 final : public Transport {
 public:
+    static constexpr int kPortmapper = 111;
+
     Vxi11(const Resource& r, std::chrono::milliseconds timeout)
         : timeout_(static_cast<int>(timeout.count())), where_(r.host + " (" + r.device + ")") {
+        // The portmapper first, within the time-out: liblxi's own connect can stall on a host
+        // that refuses it.
+        try {
+            ::close(ConnectTcp(r.host, kPortmapper, Clock::now() + timeout));
+        } catch (const StatusError& e) {
+            throw StatusError(VI_ERROR_RSRC_NFOUND, "cannot reach the VXI-11 device " + where_ +
+                                                        ": no portmapper answers (" + e.what() +
+                                                        ")");
+        }
         static std::once_flag once;
         std::call_once(once, [] { lxi_init(); });
         device_ = lxi_connect(r.host.c_str(), 0, r.device.c_str(), timeout_, VXI11);
