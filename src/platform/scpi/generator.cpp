@@ -167,10 +167,10 @@ std::string Generator::Query(const std::string& query) {
 }
 
 void Generator::Send(const std::string& commands) {
-    Send({commands});
+    SendParts({commands});
 }
 
-void Generator::Send(std::initializer_list<std::string_view> parts) {
+void Generator::SendParts(std::initializer_list<std::string_view> parts) {
     // Written piece by piece: a waveform's block goes out as it is, never copied into a message.
     for (std::string_view part : parts)
         transport_->Write(part);
@@ -574,8 +574,8 @@ ViInt32 Generator::CreateArbWaveform(ViInt32 size, const ViReal64* data) {
     const std::string header = "#" + std::to_string(length.size()) + length;
     // Each channel has a memory of its own: the waveform goes to every one.
     for (int i = 1; i <= model_->channels; ++i)
-        Send({"SOUR" + std::to_string(i) + ":DATA:ARB " + WaveformName(handle) + "," + header,
-              points});
+        SendParts({"SOUR" + std::to_string(i) + ":DATA:ARB " + WaveformName(handle) + "," + header,
+                   points});
     waveforms_[handle] = size;
     return handle;
 }

@@ -91,7 +91,8 @@ private:
     int Index(const std::string& channel) const;
     // Sends the commands, then reads the error queue: its first entry is thrown.
     void Send(const std::string& commands);
-    void Send(std::initializer_list<std::string_view> parts);
+    // The same, written piece by piece: a waveform's block goes out as it is.
+    void SendParts(std::initializer_list<std::string_view> parts);
     std::string Query(const std::string& query);
     // Everything of one channel, as the state holds it.
     std::string ChannelCommands(int index) const;
