@@ -8,7 +8,11 @@ runs=${1:-10000000}
 CC=clang CXX=clang++ cmake -S . -B build/fuzz -G Ninja -DQZIVI_FUZZ=ON -DQZIVI_BUILD_QT=OFF \
   -DQZIVI_BUILD_TESTS=OFF -DQZIVI_BUILD_BENCH=OFF -DQZIVI_BUILD_PYTHON=OFF \
   -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
-cmake --build build/fuzz -j 2 >/dev/null
+# Quiet when it builds; the compiler's words when it does not.
+if ! cmake --build build/fuzz -j 2 >build/fuzz-build.log 2>&1; then
+  tail -40 build/fuzz-build.log
+  exit 1
+fi
 export QZIVI_SESSION_MANAGER=none
 for target in bag qzc store numbers data_file scpi; do
   work=$(mktemp -d)
