@@ -169,7 +169,6 @@ void Emulator::Reset() {
     for (auto& c : channels_)
         c = ChannelState();
     swapped_ = false;
-    outputModeChannel_ = 1;
     IviFgen_AbortGeneration(vi_);
     IviFgen_ClearArbSequence(vi_, IVIFGEN_VAL_ALL_SEQUENCES);
     IviFgen_ClearArbWaveform(vi_, IVIFGEN_VAL_ALL_WAVEFORMS);
@@ -215,7 +214,6 @@ void Emulator::ApplyFunction(int channel) {
     ChannelState& c = channels_[channel - 1];
     const std::string name = Channel(channel);
     const std::size_t index = scpi::ParseChoice(Parameter{ParamKind::Text, c.function}, kFunctions);
-    outputModeChannel_ = channel;
     if (kFunctions[index] == "ARB") {
         auto& waveforms = waveforms_[channel - 1];
         auto& sequences = sequences_[channel - 1];

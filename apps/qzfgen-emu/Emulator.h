@@ -65,7 +65,6 @@ private:
     std::map<std::string, ViInt32> sequences_[2];
     ChannelState channels_[2];
     bool swapped_ = false; // FORMat:BORDer SWAPped: blocks least significant byte first
-    int outputModeChannel_ = 1;
 };
 
 } // namespace qzivi::emu
