@@ -18,7 +18,13 @@ void CheckItemCounts(const PropertyBag& bag) {
     std::string largest;
     std::int32_t largestCount = 0;
     for (const auto& name : bag.Names()) {
-        if (!name.ends_with("ItemCount") && !name.ends_with("Config_Count")) continue;
+        // Keys are found whatever their case, so they are counted whatever their case.
+        const auto endsWith = [&](std::string_view tail) {
+            return name.size() >= tail.size() &&
+                   text::EqualsNoCase(std::string_view(name).substr(name.size() - tail.size()),
+                                      tail);
+        };
+        if (!endsWith("ItemCount") && !endsWith("Config_Count")) continue;
         std::int32_t count = 0;
         try {
             count = bag.ReadInt32(name, 0);

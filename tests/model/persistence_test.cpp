@@ -127,12 +127,14 @@ TEST_F(PersistenceTest, HostileCountsAndShortPointsAreRefused) {
     // or fifty sequences of forty thousand steps each, are refused before any is made.
     PropertyBag channels;
     channels.WriteInt32("Channels_ItemCount", 1000000, 0);
+    PropertyBag otherCase; // the bag finds keys whatever their case, and so does the bound
+    otherCase.WriteInt32("Channels_ITEMCOUNT", 1000000, 0);
     PropertyBag sequences;
     sequences.WriteInt32("Sequences_ItemCount", 50, 0);
     for (int i = 1; i <= 50; ++i)
         sequences.WriteInt32("Sequences_Item" + std::to_string(i) + "_Sequence_ItemCount", 40000,
                              0);
-    for (const PropertyBag* hostile : {&channels, &sequences}) {
+    for (const PropertyBag* hostile : {&channels, &otherCase, &sequences}) {
         auto tree = NewTree();
         EXPECT_EQ(Raised([&] { tree->ReadProperties(*hostile, "", true); }),
                   runtime::kImproperFile);
