@@ -25,6 +25,9 @@ struct Model {
     double maxSampleRate; // Sa/s
     ViInt32 maxPoints;    // per arbitrary waveform
 };
+// A value as the series reads it, to 15 digits.
+std::string Number(double value);
+
 // The model of an *IDN? answer ("maker,33522B,serial,version"), or null.
 const Model* FindModel(std::string_view identity);
 
@@ -87,6 +90,10 @@ private:
         double amDepth = 100, amFrequency = 100, fmDeviation = 100, fmFrequency = 10;
         ViInt32 amWaveform = IVIFGEN_VAL_WFM_SINE, fmWaveform = IVIFGEN_VAL_WFM_SINE;
     };
+
+    // A settable attribute: its name and the piece of state it is.
+    struct Field;
+    static const Field* FindField(ViAttr attr);
 
     int Index(const std::string& channel) const;
     // Sends the commands, then reads the error queue: its first entry is thrown.
