@@ -340,16 +340,7 @@ double Instrument::ElapsedSeconds() const {
 }
 
 void Instrument::SendSoftwareTrigger() {
-    bool waiting = false;
-    for (const auto& channel : channels_)
-        waiting = waiting || (channel.operationMode == IVIFGEN_VAL_OPERATE_BURST &&
-                              channel.triggerSource == IVIFGEN_VAL_SOFTWARE_TRIG);
-    if (!waiting)
-        throw StatusError(IVIFGEN_ERROR_TRIGGER_NOT_SOFTWARE,
-                          "no channel is in burst mode with the software trigger as its source");
-    if (!generating_)
-        throw StatusError(IVIFGEN_ERROR_NOT_GENERATING,
-                          "a trigger needs generation to be initiated first");
+    ivi::RequireSoftwareTrigger(channels_, generating_);
     softwareTriggers_.push_back(ElapsedSeconds());
 }
 

@@ -38,6 +38,23 @@ private:
     ViStatus status_;
 };
 
+// The class's condition for SendSoftwareTrigger, for a driver that keeps each channel's operation
+// mode and trigger source: some channel waits in burst mode on the software trigger, and the
+// instrument generates. Throws the class's error for whichever is missing.
+template <class Channels>
+void RequireSoftwareTrigger(const Channels& channels, bool generating) {
+    bool waiting = false;
+    for (const auto& c : channels)
+        waiting = waiting || (c.operationMode == IVIFGEN_VAL_OPERATE_BURST &&
+                              c.triggerSource == IVIFGEN_VAL_SOFTWARE_TRIG);
+    if (!waiting)
+        throw StatusError(IVIFGEN_ERROR_TRIGGER_NOT_SOFTWARE,
+                          "no channel is in burst mode with the software trigger as its source");
+    if (!generating)
+        throw StatusError(IVIFGEN_ERROR_NOT_GENERATING,
+                          "a trigger needs generation to be initiated first");
+}
+
 struct Option {
     std::string name;
     std::string value;
