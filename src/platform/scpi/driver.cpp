@@ -6,7 +6,9 @@
 #include "qzivi/c_boundary.h"
 #include "qzivi/ivi_common.h"
 
+#include <array>
 #include <mutex>
+#include <utility>
 
 namespace {
 
@@ -45,6 +47,17 @@ ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
             throw StatusError(e.Status(), std::string(function) + ": " + e.what());
         }
         return VI_SUCCESS;
+    });
+}
+
+// An internal modulation source's settings, all checked before any is sent.
+ViStatus ConfigureInternalSource(ViSession vi, const char* function,
+                                 const std::array<std::pair<ViAttr, double>, 3>& settings) {
+    return Run(vi, function, [&](Generator& g) {
+        for (const auto& [attr, value] : settings)
+            g.Set(attr, "", value, true);
+        for (const auto& [attr, value] : settings)
+            g.Set(attr, "", value, false);
     });
 }
 
@@ -364,11 +377,10 @@ ViStatus QZScpiFgen_ConfigureAMSource(ViSession vi, ViConstString channel, ViInt
 
 ViStatus QZScpiFgen_ConfigureAMInternal(ViSession vi, ViReal64 depth, ViInt32 waveform,
                                         ViReal64 frequency) {
-    return Run(vi, "ConfigureAMInternal", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_AM_INTERNAL_DEPTH, "", depth, false);
-        g.Set(IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, "", waveform, false);
-        g.Set(IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, "", frequency, false);
-    });
+    return ConfigureInternalSource(vi, "ConfigureAMInternal",
+                                   {{{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, depth},
+                                     {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, double(waveform)},
+                                     {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, frequency}}});
 }
 
 ViStatus QZScpiFgen_ConfigureFMEnabled(ViSession vi, ViConstString channel, ViBoolean enabled) {
@@ -385,11 +397,10 @@ ViStatus QZScpiFgen_ConfigureFMSource(ViSession vi, ViConstString channel, ViInt
 
 ViStatus QZScpiFgen_ConfigureFMInternal(ViSession vi, ViReal64 deviation, ViInt32 waveform,
                                         ViReal64 frequency) {
-    return Run(vi, "ConfigureFMInternal", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, "", deviation, false);
-        g.Set(IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, "", waveform, false);
-        g.Set(IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, "", frequency, false);
-    });
+    return ConfigureInternalSource(vi, "ConfigureFMInternal",
+                                   {{{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, deviation},
+                                     {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, double(waveform)},
+                                     {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, frequency}}});
 }
 
 ViStatus QZScpiFgen_InitiateGeneration(ViSession vi) {
