@@ -363,32 +363,24 @@ std::vector<Emulator::Entry> Emulator::Table() {
     add("[SOURce#:]VOLTage[:LEVel][:IMMediate][:AMPLitude]",
         number(IVIFGEN_ATTR_FUNC_AMPLITUDE, "V"));
     add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:OFFSet", number(IVIFGEN_ATTR_FUNC_DC_OFFSET, "V"));
-    add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:HIGH",
-        {"",
-         [](Call& c) {
-             c.Count(1);
-             const double amplitude = c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE);
-             const double offset = c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET);
-             const double high = scpi::ParseNumber(c.Param(0), -5, 5, offset + amplitude / 2, "V");
-             c.emu.SetVoltageEdges(c.channel, high, offset - amplitude / 2);
-         },
-         [](Call& c) {
-             return FormatNumber(c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET) +
-                                 c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE) / 2);
-         }});
-    add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:LOW",
-        {"",
-         [](Call& c) {
-             c.Count(1);
-             const double amplitude = c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE);
-             const double offset = c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET);
-             const double low = scpi::ParseNumber(c.Param(0), -5, 5, offset - amplitude / 2, "V");
-             c.emu.SetVoltageEdges(c.channel, offset + amplitude / 2, low);
-         },
-         [](Call& c) {
-             return FormatNumber(c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET) -
-                                 c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE) / 2);
-         }});
+    // The high and low levels, as amplitude and offset: setting one keeps the other.
+    auto edge = [](double side) {
+        auto level = [side](Call& c) {
+            return c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET) +
+                   side * c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE) / 2;
+        };
+        return Entry{"",
+                     [=](Call& c) {
+                         c.Count(1);
+                         const double other = level(c) - side * c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE);
+                         const double value = scpi::ParseNumber(c.Param(0), -5, 5, level(c), "V");
+                         c.emu.SetVoltageEdges(c.channel, side > 0 ? value : other,
+                                               side > 0 ? other : value);
+                     },
+                     [=](Call& c) { return FormatNumber(level(c)); }};
+    };
+    add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:HIGH", edge(+1));
+    add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:LOW", edge(-1));
     add("[SOURce#:]VOLTage:UNIT",
         {"",
          [](Call& c) {

@@ -125,6 +125,8 @@ TEST_F(EmulatorTest, SettingsReachTheSimulatorsOutput) {
     EXPECT_THAT(Render(2, 1e-4, 2), ElementsAre(0, 0)) << "channel 2's output is off";
     emu_.Execute("VOLT:HIGH 3;VOLT:LOW -1");
     EXPECT_EQ(emu_.Execute("VOLT?;VOLT:OFFS?"), "+4.000000000000000E+00;+1.000000000000000E+00");
+    EXPECT_EQ(emu_.Execute("VOLT:HIGH?;VOLT:LOW?"),
+              "+3.000000000000000E+00;-1.000000000000000E+00");
     emu_.Execute("OUTP:LOAD INF");
     EXPECT_EQ(emu_.Execute("OUTP:LOAD?"), "+9.900000000000000E+37");
 }
