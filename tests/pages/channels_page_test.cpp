@@ -22,15 +22,9 @@
 
 using namespace qzivi;
 
-class ChannelsPageTest : public QObject {
+class ChannelsPageTest : public QObject, test::PageTest<PChannels> {
     Q_OBJECT
 
-    using Bench = test::PageBench;
-    std::unique_ptr<Bench> bench_;
-    PChannels* page_ = nullptr;
-
-    QZIviFgen& Control() { return *bench_->control; }
-    void Open() { page_ = bench_->Open<PChannels>(); }
     void Reopen() {
         bench_->host.reset();
         Open();

@@ -22,13 +22,15 @@ namespace qzivi::test {
 
 class PageBench {
 public:
-    PageBench() {
+    // `asMade`: the control as it comes, not with every extension on and its exceptions off.
+    explicit PageBench(bool asMade = false) {
         ::setenv("QZIVI_SESSION_MANAGER", "none", 1);
         InstallQtMessageBoxes(); // before the scope, which then wins
         boxScope = std::make_unique<MessageBoxScope>(
             [this](const MessageBoxRequest& r) { boxes.push_back(r); });
         control = std::make_unique<QZIviFgen>();
         control->InitProperties();
+        if (asMade) return;
         control->ExceptionOnError(false);
         control->Extensions(0x3FF);
     }
@@ -87,6 +89,7 @@ public:
     // F2 on the entry, the text, Return.
     static void Rename(QListWidget* list, QLineEdit* box, int row, const QString& name) {
         list->setCurrentRow(row);
+        list->setFocus();
         QTest::keyClick(list, Qt::Key_F2);
         Enter(box, name);
     }
@@ -123,6 +126,19 @@ public:
     std::unique_ptr<MessageBoxScope> boxScope;
     std::unique_ptr<QZIviFgen> control;
     std::unique_ptr<CPageHost> host;
+};
+
+// What each page's test class keeps: a bench made anew for every test, and the page it shows.
+template <typename P>
+class PageTest {
+protected:
+    using Bench = PageBench;
+    QZIviFgen& Control() { return *bench_->control; }
+    CPageHost& Host() { return *bench_->host; }
+    void Open() { page_ = bench_->template Open<P>(); }
+
+    std::unique_ptr<PageBench> bench_;
+    P* page_ = nullptr;
 };
 
 } // namespace qzivi::test

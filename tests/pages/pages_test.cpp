@@ -1,9 +1,6 @@
 // The control page and the general page in the page host, on a control of their own: what they
 // show, what they save, and which of their applies make the other pages reload.
-#include "../platform/test_support.h"
-#include "qzivi/control/QZIviFgen.h"
-#include "qzivi/driver/ErrorModule.h"
-#include "qzivi/pages/CPageHost.h"
+#include "page_bench.h"
 #include "qzivi/pages/PExtensions.h"
 #include "qzivi/pages/PGeneral.h"
 #include "qzivi/pages/PInternal.h"
@@ -20,82 +17,62 @@
 
 using namespace qzivi;
 
-class PagesTest : public QObject {
+class PagesTest : public QObject, test::PageTest<PIviX> {
     Q_OBJECT
 
-    std::unique_ptr<test::StoreScope> store_;
-    std::unique_ptr<QZIviFgen> control_;
-    std::unique_ptr<CPageHost> host_;
-    PIviX* control_page_ = nullptr;
     PGeneral* general_ = nullptr;
     PExtensions* extensions_ = nullptr;
     PInternal* internal_ = nullptr;
 
     void Open() {
-        host_ = std::make_unique<CPageHost>(std::vector<QZIviFgen*>{control_.get()});
-        control_page_ = new PIviX;
-        general_ = new PGeneral;
-        extensions_ = new PExtensions;
-        internal_ = new PInternal;
-        host_->AddPage(control_page_);
-        host_->AddPage(general_);
-        host_->AddPage(extensions_);
-        host_->AddPage(internal_);
-        host_->show();
+        PageTest::Open();
+        general_ = bench_->Page<PGeneral>();
+        extensions_ = bench_->Page<PExtensions>();
+        internal_ = bench_->Page<PInternal>();
     }
     void Click(QWidget* box) { QTest::mouseClick(box, Qt::LeftButton, {}, QPoint(4, 4)); }
 
 private slots:
-    void init() {
-        ::setenv("QZIVI_SESSION_MANAGER", "none", 1);
-        store_ = std::make_unique<test::StoreScope>();
-        control_ = std::make_unique<QZIviFgen>();
-        control_->InitProperties();
-    }
-    void cleanup() {
-        host_.reset();
-        control_.reset();
-        store_.reset();
-    }
+    void init() { bench_ = std::make_unique<Bench>(true); }
+    void cleanup() { bench_.reset(); }
 
     void theControlPageShowsAnUnlistedNameAsItStandsAndItsStylePreview() {
-        control_->LogicalName("Bench7");
-        control_->UIStyle(1);
+        Control().LogicalName("Bench7");
+        Control().UIStyle(1);
         Open();
-        QVERIFY(control_page_->cmbLogicalName->findText("SampleFGen") >= 0);
-        QCOMPARE(control_page_->cmbLogicalName->currentText(), QStringLiteral("Bench7"));
-        QCOMPARE(control_page_->cmbUIStyle->count(), 3);
-        QCOMPARE(control_page_->cmbUIStyle->currentText(), QStringLiteral("Allow Control"));
-        const QImage shown = control_page_->imgUIStyle->pixmap().toImage();
-        const QImage expected =
-            LoadPictureFromResource(2001)
-                .pixmap(control_page_->imgUIStyle->size(), control_page_->devicePixelRatioF())
-                .toImage();
+        QVERIFY(page_->cmbLogicalName->findText("SampleFGen") >= 0);
+        QCOMPARE(page_->cmbLogicalName->currentText(), QStringLiteral("Bench7"));
+        QCOMPARE(page_->cmbUIStyle->count(), 3);
+        QCOMPARE(page_->cmbUIStyle->currentText(), QStringLiteral("Allow Control"));
+        const QImage shown = page_->imgUIStyle->pixmap().toImage();
+        const QImage expected = LoadPictureFromResource(2001)
+                                    .pixmap(page_->imgUIStyle->size(), page_->devicePixelRatioF())
+                                    .toImage();
         QVERIFY(!shown.isNull());
         QVERIFY(shown == expected);
-        QVERIFY(!control_page_->Changed());
-        QVERIFY(control_page_->chkIviX[1]->isChecked()); // ExceptionOnError
-        QCOMPARE(control_page_->chkIviX[1]->text(), QStringLiteral("Exception on errors"));
+        QVERIFY(!page_->Changed());
+        QVERIFY(page_->chkIviX[1]->isChecked()); // ExceptionOnError
+        QCOMPARE(page_->chkIviX[1]->text(), QStringLiteral("Exception on errors"));
 
-        QTest::mouseClick(control_page_->chkIviX[2], Qt::LeftButton);
-        host_->Apply();
-        QCOMPARE(control_->LogicalName(), std::string("Bench7")); // saved unchanged
-        QVERIFY(control_->AutoConfigure());
-        QCOMPARE(control_->UIStyle(), 1);
+        Click(page_->chkIviX[2]);
+        Host().Apply();
+        QCOMPARE(Control().LogicalName(), std::string("Bench7")); // saved unchanged
+        QVERIFY(Control().AutoConfigure());
+        QCOMPARE(Control().UIStyle(), 1);
     }
 
     void onlyANewLogicalNameMakesTheOtherPagesReload() {
         Open();
-        QTest::mouseClick(control_page_->chkIviX[3], Qt::LeftButton);
-        host_->Apply();
-        QCOMPARE(control_->LastChangeIndex(), 0);
-        control_page_->cmbLogicalName->setEditText("Bench7");
-        host_->Apply();
-        QCOMPARE(control_->LastChangeIndex(), 1);
-        QCOMPARE(control_->LogicalName(), std::string("Bench7"));
-        control_page_->Changed(true);
-        host_->Apply();
-        QCOMPARE(control_->LastChangeIndex(), 1);
+        Click(page_->chkIviX[3]);
+        Host().Apply();
+        QCOMPARE(Control().LastChangeIndex(), 0);
+        page_->cmbLogicalName->setEditText("Bench7");
+        Host().Apply();
+        QCOMPARE(Control().LastChangeIndex(), 1);
+        QCOMPARE(Control().LogicalName(), std::string("Bench7"));
+        page_->Changed(true);
+        Host().Apply();
+        QCOMPARE(Control().LastChangeIndex(), 1);
     }
 
     void theConfigurationButtonOpensTheStoreOrSaysItCannot() {
@@ -106,14 +83,13 @@ private slots:
                 opened = path;
                 return true;
             });
-            QTest::mouseClick(control_page_->cmdBMC, Qt::LeftButton);
+            QTest::mouseClick(page_->cmdBMC, Qt::LeftButton);
         }
-        QCOMPARE(opened.toStdString(), (store_->Dir() / "qzivi" / "qzivi.conf").string());
+        QCOMPARE(opened.toStdString(), (bench_->store.Dir() / "qzivi" / "qzivi.conf").string());
 
-        std::vector<MessageBoxRequest> boxes;
+        const auto& boxes = bench_->boxes;
         const StoreEditorScope none([](const QString&) { return false; });
-        const MessageBoxScope shown([&](const MessageBoxRequest& r) { boxes.push_back(r); });
-        QTest::mouseClick(control_page_->cmdBMC, Qt::LeftButton);
+        QTest::mouseClick(page_->cmdBMC, Qt::LeftButton);
         QCOMPARE(boxes.size(), std::size_t{1});
         QCOMPARE(boxes[0].text, std::string("Incorrect version of the Benchmate Console.  Please "
                                             "update to the latest version for this "
@@ -122,39 +98,39 @@ private slots:
     }
 
     void theGeneralPageDropsAModeWhoseExtensionWasTakenAway() {
-        control_->Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt);
-        control_->OutputMode(qzivifgenOutputSeq);
+        Control().Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt | qzivifgenArbSeqExt);
+        Control().OutputMode(qzivifgenOutputSeq);
         Open();
         QCOMPARE(general_->cmbGeneral[0]->count(), 3);
         QCOMPARE(general_->cmbGeneral[0]->currentText(), QStringLiteral("Arb Sequence"));
         // The extensions page (here, the copy itself) takes the sequences away and alerts.
-        control_->PropCopy()->Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt);
-        control_->IncrementLastChangeIndex();
-        host_->Tabs().setCurrentIndex(1);
+        Control().PropCopy()->Extensions(qzivifgenStdFuncExt | qzivifgenArbWfmExt);
+        Control().IncrementLastChangeIndex();
+        bench_->Show<PGeneral>();
         QCOMPARE(general_->cmbGeneral[0]->count(), 2);
-        QCOMPARE(control_->PropCopy()->OutputMode(), qzivifgenOutputFunc);
+        QCOMPARE(Control().PropCopy()->OutputMode(), qzivifgenOutputFunc);
         QVERIFY(!general_->Changed()); // no action of the user
     }
 
     void theSampleRateIsTheLeadingNumber() {
         Open();
-        host_->Tabs().setCurrentIndex(1);
+        bench_->Show<PGeneral>();
         general_->txtGeneral->setText("2k");
         QVERIFY(general_->Changed());
-        host_->Apply();
-        QCOMPARE(control_->ArbSampleRate(), 2.0);
+        Host().Apply();
+        QCOMPARE(Control().ArbSampleRate(), 2.0);
         general_->txtGeneral->setText("2.5e6 Hz");
-        host_->Apply();
-        QCOMPARE(control_->ArbSampleRate(), 2.5e6);
+        Host().Apply();
+        QCOMPARE(Control().ArbSampleRate(), 2.5e6);
         general_->txtGeneral->setText("fast");
-        host_->Apply();
-        QCOMPARE(control_->ArbSampleRate(), 0.0);
+        Host().Apply();
+        QCOMPARE(Control().ArbSampleRate(), 0.0);
     }
 
     void theTriggerOptionsAndTheSequenceBoxFallWithTheirParents() {
-        control_->Extensions(0x3FF);
+        Control().Extensions(0x3FF);
         Open();
-        host_->Tabs().setCurrentIndex(2);
+        bench_->Show<PExtensions>();
         auto** box = extensions_->chkExtension;
         Click(box[5]);
         for (int i : {6, 7, 8})
@@ -185,60 +161,60 @@ private slots:
             QCOMPARE(FixedOutputMode(c.mask, c.mode), c.fixed);
 
         // Through the page: the waveform box off takes the sequences along, and the mode.
-        control_->Extensions(0x3FF | 0x4000);
-        control_->OutputMode(qzivifgenOutputSeq);
+        Control().Extensions(0x3FF | 0x4000);
+        Control().OutputMode(qzivifgenOutputSeq);
         Open();
-        host_->Tabs().setCurrentIndex(2);
-        const std::int32_t before = control_->LastChangeIndex();
+        bench_->Show<PExtensions>();
+        const std::int32_t before = Control().LastChangeIndex();
         Click(extensions_->chkExtension[2]);
-        host_->Apply();
-        QCOMPARE(control_->OutputMode(), qzivifgenOutputFunc);
-        QCOMPARE(control_->Extensions(), 0x3FF & ~(qzivifgenArbWfmExt | qzivifgenArbSeqExt));
-        QCOMPARE(control_->LastChangeIndex(), before + 1); // the other pages reload
-        host_->Tabs().setCurrentIndex(1);
+        Host().Apply();
+        QCOMPARE(Control().OutputMode(), qzivifgenOutputFunc);
+        QCOMPARE(Control().Extensions(), 0x3FF & ~(qzivifgenArbWfmExt | qzivifgenArbSeqExt));
+        QCOMPARE(Control().LastChangeIndex(), before + 1); // the other pages reload
+        bench_->Show<PGeneral>();
         QCOMPARE(general_->cmbGeneral[0]->count(), 1);
     }
 
     void closedInternalFieldsAreBlankAndKeepTheirValues() {
-        control_->Extensions(0);
-        control_->Internal()->AMInternalDepth(42);
+        Control().Extensions(0);
+        Control().Internal()->AMInternalDepth(42);
         Open();
-        host_->Tabs().setCurrentIndex(3);
+        bench_->Show<PInternal>();
         for (int i : {0, 1, 3, 4, 6}) {
             QVERIFY(!internal_->txtInternal[i]->isEnabled());
             QVERIFY(internal_->txtInternal[i]->text().isEmpty());
         }
         QCOMPARE(internal_->cmbWaveform[2]->count(), 0);
         internal_->Changed(true);
-        host_->Apply();
-        QCOMPARE(control_->Internal()->AMInternalDepth(), 42.0);
+        Host().Apply();
+        QCOMPARE(Control().Internal()->AMInternalDepth(), 42.0);
     }
 
     void onlyTheOpenFMFieldsAreStored() {
-        control_->Extensions(qzivifgenModulateFMExt);
-        const double rate = control_->Internal()->InternalTriggerRate();
+        Control().Extensions(qzivifgenModulateFMExt);
+        const double rate = Control().Internal()->InternalTriggerRate();
         Open();
-        host_->Tabs().setCurrentIndex(3);
-        QCOMPARE(host_->focusWidget(), internal_->txtInternal[4]); // the last open group wins
+        bench_->Show<PInternal>();
+        QCOMPARE(Host().focusWidget(), internal_->txtInternal[4]); // the last open group wins
         internal_->txtInternal[4]->setText("12.5");
         internal_->txtInternal[6]->setText("400");
-        host_->Apply();
-        QCOMPARE(control_->Internal()->FMInternalDeviation(), 12.5);
-        QCOMPARE(control_->Internal()->FMInternalFrequency(), 400.0);
-        QCOMPARE(control_->Internal()->InternalTriggerRate(), rate);
+        Host().Apply();
+        QCOMPARE(Control().Internal()->FMInternalDeviation(), 12.5);
+        QCOMPARE(Control().Internal()->FMInternalFrequency(), 400.0);
+        QCOMPARE(Control().Internal()->InternalTriggerRate(), rate);
     }
 
     void aBadNumberStopsTheInternalSaveThere() {
-        control_->Extensions(0x3FF);
+        Control().Extensions(0x3FF);
         Open();
-        host_->Tabs().setCurrentIndex(3);
-        const double frequency = control_->Internal()->AMInternalFrequency();
+        bench_->Show<PInternal>();
+        const double frequency = Control().Internal()->AMInternalFrequency();
         internal_->txtInternal[0]->setText("250");
         internal_->txtInternal[1]->setText("lots");
         internal_->txtInternal[3]->setText("77");
-        host_->Apply();
-        QCOMPARE(control_->Internal()->InternalTriggerRate(), 250.0);
-        QCOMPARE(control_->Internal()->AMInternalFrequency(), frequency);
+        Host().Apply();
+        QCOMPARE(Control().Internal()->InternalTriggerRate(), 250.0);
+        QCOMPARE(Control().Internal()->AMInternalFrequency(), frequency);
     }
 };
 

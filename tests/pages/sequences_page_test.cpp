@@ -13,14 +13,9 @@
 
 using namespace qzivi;
 
-class SequencesPageTest : public QObject {
+class SequencesPageTest : public QObject, test::PageTest<PSequence> {
     Q_OBJECT
 
-    using Bench = test::PageBench;
-    std::unique_ptr<Bench> bench_;
-    PSequence* page_ = nullptr;
-
-    QZIviFgen& Control() { return *bench_->control; }
     // A waveform of eight equal points, read from its file without normalising.
     void AddLevel(const std::string& name, double level) {
         const std::string path = (bench_->store.Dir() / (name + ".txt")).string();

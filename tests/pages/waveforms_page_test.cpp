@@ -38,14 +38,9 @@ std::string WriteFile(const std::filesystem::path& path, int format,
 
 } // namespace
 
-class WaveformsPageTest : public QObject {
+class WaveformsPageTest : public QObject, test::PageTest<PArb> {
     Q_OBJECT
 
-    using Bench = test::PageBench;
-    std::unique_ptr<Bench> bench_;
-    PArb* page_ = nullptr;
-
-    QZIviFgen& Control() { return *bench_->control; }
     std::filesystem::path Dir() const { return bench_->store.Dir(); }
     void ComparePreview(const std::vector<double>& expected, double tolerance) {
         const auto& shown = page_->qzgrphPreview->Data();
