@@ -116,12 +116,18 @@ class NetworkTest : public ::testing::Test {
 protected:
     NetworkTest() { ::setenv("QZIVI_SESSION_MANAGER", "none", 1); }
 
+    // "Bench" in the store: the SCPI driver on `resource`.
+    void UseBench(const std::string& resource, const std::string& more = "") {
+        store_.UseStore(std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
+                        "\nprefix = QZScpiFgen\nresource = " + resource + "\n" + more);
+    }
     void UseInstrumentAt(int port, int timeoutMs = 2000) {
-        store_.UseStore(
-            std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
-            "\nprefix = QZScpiFgen\nresource = TCPIP0::127.0.0.1::" + std::to_string(port) +
-            "::SOCKET\noptions = DriverSetup=Timeout=" + std::to_string(timeoutMs) +
-            "\nchannel Channel1 = 1\nchannel Channel2 = 2\n");
+        UseBench("TCPIP0::127.0.0.1::" + std::to_string(port) + "::SOCKET",
+                 "options = DriverSetup=Timeout=" + std::to_string(timeoutMs) +
+                     "\nchannel Channel1 = 1\nchannel Channel2 = 2\n");
+    }
+    static ViStatus OpenBench(ViSession* vi, ViBoolean reset = VI_FALSE) {
+        return IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, reset, "", vi);
     }
     // The samples `qzfgen render` writes, and its exit code.
     std::pair<int, std::vector<double>>
@@ -264,22 +270,17 @@ TEST_F(NetworkTest, ALostInstrumentIsAnErrorAndTheNextInitConnectsAgain) {
     const int port = emulator->Port();
     UseInstrumentAt(port);
     ViSession vi = 0;
-    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
-              VI_SUCCESS)
-        << LastError();
+    ASSERT_EQ(OpenBench(&vi, VI_TRUE), VI_SUCCESS) << LastError();
     ASSERT_EQ(IviFgen_ConfigureOutputEnabled(vi, "Channel1", VI_TRUE), VI_SUCCESS);
     emulator->Kill();
     const ViStatus lost = IviFgen_ConfigureOutputEnabled(vi, "Channel1", VI_FALSE);
     EXPECT_TRUE(lost == VI_ERROR_CONN_LOST || lost == VI_ERROR_TMO) << std::hex << lost;
     EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
-    EXPECT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
-              VI_ERROR_RSRC_NFOUND);
+    EXPECT_EQ(OpenBench(&vi, VI_TRUE), VI_ERROR_RSRC_NFOUND);
     EXPECT_NE(LastError().find("cannot connect to 127.0.0.1:" + std::to_string(port)),
               std::string::npos);
     emulator = std::make_unique<Emulator>(port); // back on its port
-    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_TRUE, "", &vi),
-              VI_SUCCESS)
-        << LastError();
+    ASSERT_EQ(OpenBench(&vi, VI_TRUE), VI_SUCCESS) << LastError();
     EXPECT_EQ(
         IviFgen_ConfigureStandardWaveform(vi, "Channel2", IVIFGEN_VAL_WFM_SQUARE, 1, 0, 1e3, 0),
         VI_SUCCESS);
@@ -319,9 +320,7 @@ TEST_F(NetworkTest, SilentGarbledAndUnknownInstrumentsAreRefusedWithTheirCause) 
         FakeInstrument fake(c.answer);
         UseInstrumentAt(fake.Port(), 300);
         ViSession vi = 0;
-        EXPECT_EQ(
-            IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
-            c.status);
+        EXPECT_EQ(OpenBench(&vi), c.status);
         EXPECT_NE(LastError().find(c.told), std::string::npos) << LastError();
         EXPECT_EQ(vi, 0u);
     }
@@ -338,9 +337,7 @@ TEST_F(NetworkTest, AnInstrumentThatDiesMidCallEndsTheCallWithItsCause) {
         64 * 1024);
     UseInstrumentAt(dying.Port(), 2000);
     ViSession vi = 0;
-    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
-              VI_SUCCESS)
-        << LastError();
+    ASSERT_EQ(OpenBench(&vi), VI_SUCCESS) << LastError();
     const std::vector<ViReal64> points(1000000, 0.5);
     ViInt32 handle = 0;
     const ViStatus status =
@@ -379,29 +376,20 @@ TEST_F(NetworkTest, GarbledSamplesAndBadResourcesAreErrors) {
     });
     UseInstrumentAt(fake.Port(), 300);
     ViSession vi = 0;
-    ASSERT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
-              VI_SUCCESS)
-        << LastError();
+    ASSERT_EQ(OpenBench(&vi), VI_SUCCESS) << LastError();
     ViReal64 volts[2];
     EXPECT_EQ(QZIvi_RenderOutput(vi, "Channel1", 0, 1e-6, 2, volts), VI_ERROR_IO);
     EXPECT_EQ(IviFgen_close(vi), VI_SUCCESS);
     for (const char* resource :
          {"TCPIP0::127.0.0.1::SOCKET", "GPIB0::7::INSTR", "TCPIP0::127.0.0.1::99999::SOCKET"}) {
-        store_.UseStore(std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
-                        "\nprefix = QZScpiFgen\nresource = " + resource + "\n");
-        EXPECT_EQ(
-            IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
-            VI_ERROR_RSRC_NFOUND)
-            << resource;
+        UseBench(resource);
+        EXPECT_EQ(OpenBench(&vi), VI_ERROR_RSRC_NFOUND) << resource;
         EXPECT_NE(LastError().find("is no resource of a network instrument"), std::string::npos)
             << resource;
     }
     // VXI-11 on a host where no instrument listens: refused with the transport's words.
-    store_.UseStore(std::string("[Bench]\nmodule = ") + QZIVI_TEST_SCPI_MODULE +
-                    "\nprefix = QZScpiFgen\nresource = TCPIP0::127.0.0.1::inst0::INSTR\n"
-                    "options = DriverSetup=Timeout=500\n");
-    EXPECT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>("Bench"), VI_FALSE, VI_FALSE, "", &vi),
-              VI_ERROR_RSRC_NFOUND);
+    UseBench("TCPIP0::127.0.0.1::inst0::INSTR", "options = DriverSetup=Timeout=500\n");
+    EXPECT_EQ(OpenBench(&vi), VI_ERROR_RSRC_NFOUND);
     EXPECT_NE(LastError().find("cannot reach the VXI-11 device 127.0.0.1 (inst0)"),
               std::string::npos)
         << LastError();
