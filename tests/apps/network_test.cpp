@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include <arpa/inet.h>
+#include <cmath>
 #include <csignal>
 #include <cstdio>
 #include <fstream>
@@ -263,6 +264,35 @@ TEST_F(NetworkTest, ARefusedValueIsReportedAsTheSimulatorReportsIt) {
     EXPECT_NE(network.description.find("-222,\"Data out of range;amplitude clipped to 1 Vpp\""),
               std::string::npos)
         << network.description;
+}
+
+// The caller's type must be the attribute's: an infinity given to an integer is refused whole.
+TEST_F(NetworkTest, AttributesOfAnotherTypeAreRefusedAsTheSimulatorRefusesThem) {
+    Emulator emulator;
+    UseInstrumentAt(emulator.Port());
+    const auto statuses = [](const char* name) {
+        ViSession vi = 0;
+        EXPECT_EQ(IviFgen_InitWithOptions(const_cast<ViChar*>(name), VI_FALSE, VI_TRUE, "", &vi),
+                  VI_SUCCESS);
+        ViInt32 integer = 0;
+        ViReal64 real = 0;
+        ViBoolean boolean = VI_FALSE;
+        std::vector<ViStatus> got = {
+            IviFgen_SetAttributeViReal64(vi, "Channel1", IVIFGEN_ATTR_OPERATION_MODE, HUGE_VAL),
+            IviFgen_CheckAttributeViInt32(vi, "Channel1", IVIFGEN_ATTR_FUNC_AMPLITUDE, 2),
+            IviFgen_SetAttributeViBoolean(vi, "Channel1", IVIFGEN_ATTR_BURST_COUNT, VI_TRUE),
+            IviFgen_GetAttributeViInt32(vi, "Channel1", IVIFGEN_ATTR_FUNC_FREQUENCY, &integer),
+            IviFgen_GetAttributeViReal64(vi, "", IVIFGEN_ATTR_MAX_NUM_WAVEFORMS, &real),
+            IviFgen_GetAttributeViBoolean(vi, "Channel1", IVIFGEN_ATTR_BURST_COUNT, &boolean),
+            IviFgen_GetAttributeViInt32(vi, "Channel1", IVIFGEN_ATTR_OPERATION_MODE, &integer)};
+        got.push_back(integer);
+        IviFgen_close(vi);
+        return got;
+    };
+    const auto simulated = statuses("SampleFGen");
+    EXPECT_EQ(statuses("Bench"), simulated);
+    EXPECT_EQ(simulated.front(), IVI_ERROR_TYPES_DO_NOT_MATCH);
+    EXPECT_EQ(simulated.back(), IVIFGEN_VAL_OPERATE_CONTINUOUS) << "the mode stayed as it was";
 }
 
 TEST_F(NetworkTest, ALostInstrumentIsAnErrorAndTheNextInitConnectsAgain) {

@@ -79,6 +79,20 @@ const Generator::Field* Generator::FindField(ViAttr attr) {
     return nullptr;
 }
 
+void Generator::RequireType(ViAttr attr, Type type) {
+    const Field* field = FindField(attr);
+    // The attributes outside the table are the memory's limits, all integers.
+    const Type own = field == nullptr                 ? Type::Int32
+                     : field->member.index() == 4     ? Type::Boolean
+                     : field->member.index() % 2 == 0 ? Type::Real64
+                                                      : Type::Int32;
+    if (type == own) return;
+    static constexpr const char* kNames[] = {"ViInt32", "ViReal64", "ViBoolean"};
+    throw StatusError(IVI_ERROR_TYPES_DO_NOT_MATCH,
+                      (field != nullptr ? std::string(field->word) : std::to_string(attr)) +
+                          " is of type " + kNames[int(own)] + ", not " + kNames[int(type)]);
+}
+
 double Generator::Get(ViAttr attr, const std::string& channel) const {
     switch (attr) {
     case IVIFGEN_ATTR_MAX_NUM_WAVEFORMS:

@@ -158,6 +158,7 @@ ViStatus QZScpiFgen_GetAttributeViInt32(ViSession vi, ViConstString channel, ViA
         case IVI_ATTR_SPECIFIC_DRIVER_CLASS_SPEC_MINOR_VERSION:
             return Out(value, ViInt32{0});
         default:
+            Generator::RequireType(attr, Generator::Type::Int32);
             return Out(value, static_cast<ViInt32>(g.Get(attr, Channel(channel))));
         }
     });
@@ -165,13 +166,16 @@ ViStatus QZScpiFgen_GetAttributeViInt32(ViSession vi, ViConstString channel, ViA
 
 ViStatus QZScpiFgen_GetAttributeViReal64(ViSession vi, ViConstString channel, ViAttr attr,
                                          ViReal64* value) {
-    return Run(vi, "GetAttributeViReal64",
-               [&](Generator& g) { Out(value, g.Get(attr, Channel(channel))); });
+    return Run(vi, "GetAttributeViReal64", [&](Generator& g) {
+        Generator::RequireType(attr, Generator::Type::Real64);
+        Out(value, g.Get(attr, Channel(channel)));
+    });
 }
 
 ViStatus QZScpiFgen_GetAttributeViBoolean(ViSession vi, ViConstString channel, ViAttr attr,
                                           ViBoolean* value) {
     return Run(vi, "GetAttributeViBoolean", [&](Generator& g) {
+        if (attr != IVI_ATTR_SIMULATE) Generator::RequireType(attr, Generator::Type::Boolean);
         Out(value, attr == IVI_ATTR_SIMULATE
                        ? ViBoolean{VI_FALSE}
                        : ViBoolean(g.Get(attr, Channel(channel)) != 0 ? VI_TRUE : VI_FALSE));
@@ -219,22 +223,24 @@ ViStatus QZScpiFgen_GetAttributeViString(ViSession vi, ViConstString channel, Vi
     return status != VI_SUCCESS ? status : fits;
 }
 
-#define QZSCPI_SET_AND_CHECK(Type, Suffix)                                                         \
-    ViStatus QZScpiFgen_SetAttribute##Suffix(ViSession vi, ViConstString channel, ViAttr attr,     \
-                                             Type value) {                                         \
-        return Run(vi, "SetAttribute" #Suffix, [&](Generator& g) {                                 \
+#define QZSCPI_SET_AND_CHECK(CType, Kind)                                                          \
+    ViStatus QZScpiFgen_SetAttribute##CType(ViSession vi, ViConstString channel, ViAttr attr,      \
+                                            CType value) {                                         \
+        return Run(vi, "SetAttribute" #CType, [&](Generator& g) {                                  \
+            Generator::RequireType(attr, Generator::Type::Kind);                                   \
             g.Set(attr, Channel(channel), static_cast<double>(value), false);                      \
         });                                                                                        \
     }                                                                                              \
-    ViStatus QZScpiFgen_CheckAttribute##Suffix(ViSession vi, ViConstString channel, ViAttr attr,   \
-                                               Type value) {                                       \
-        return Run(vi, "CheckAttribute" #Suffix, [&](Generator& g) {                               \
+    ViStatus QZScpiFgen_CheckAttribute##CType(ViSession vi, ViConstString channel, ViAttr attr,    \
+                                              CType value) {                                       \
+        return Run(vi, "CheckAttribute" #CType, [&](Generator& g) {                                \
+            Generator::RequireType(attr, Generator::Type::Kind);                                   \
             g.Set(attr, Channel(channel), static_cast<double>(value), true);                       \
         });                                                                                        \
     }
-QZSCPI_SET_AND_CHECK(ViInt32, ViInt32)
-QZSCPI_SET_AND_CHECK(ViReal64, ViReal64)
-QZSCPI_SET_AND_CHECK(ViBoolean, ViBoolean)
+QZSCPI_SET_AND_CHECK(ViInt32, Int32)
+QZSCPI_SET_AND_CHECK(ViReal64, Real64)
+QZSCPI_SET_AND_CHECK(ViBoolean, Boolean)
 #undef QZSCPI_SET_AND_CHECK
 
 ViStatus QZScpiFgen_ConfigureOutputMode(ViSession vi, ViInt32 outputMode) {

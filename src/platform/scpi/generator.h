@@ -40,6 +40,10 @@ public:
     const std::string& Identity() const { return identity_; }
     const std::string& Resource() const { return resource_; }
 
+    // Refuses a caller's type other than the attribute's, as the class requires.
+    enum class Type { Int32, Real64, Boolean };
+    static void RequireType(ViAttr attr, Type type);
+
     // Attributes by IVI id; `channel` the physical name "1", "2" (empty for the session's own).
     double Get(ViAttr attr, const std::string& channel) const;
     void Set(ViAttr attr, const std::string& channel, double value, bool checkOnly);
