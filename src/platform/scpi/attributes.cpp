@@ -14,6 +14,35 @@ namespace qzivi::scpi {
 
 using ivi::StatusError;
 
+namespace {
+
+template <class M>
+struct MemberOf;
+template <class T, class S>
+struct MemberOf<T S::*> {
+    using Owner = S;
+    using Type = T;
+};
+
+// The global state or the channel's, whichever the member belongs to.
+template <class M, class G, class C>
+auto& Owner(M, G& global, C& channel) {
+    if constexpr (std::is_same_v<typename MemberOf<M>::Owner, std::remove_const_t<G>>)
+        return global;
+    else
+        return channel;
+}
+
+template <class M>
+constexpr Generator::Type TypeOf(M) {
+    using T = typename MemberOf<M>::Type;
+    return std::is_same_v<T, bool>     ? Generator::Type::Boolean
+           : std::is_same_v<T, double> ? Generator::Type::Real64
+                                       : Generator::Type::Int32;
+}
+
+} // namespace
+
 struct Generator::Field {
     ViAttr attr;
     const char* word;
@@ -21,21 +50,15 @@ struct Generator::Field {
                  bool Channel::*>
         member;
 
-    bool IsGlobal() const { return member.index() < 2; }
+    bool IsGlobal() const {
+        return std::visit(
+            [](auto m) { return std::is_same_v<typename MemberOf<decltype(m)>::Owner, Global>; },
+            member);
+    }
+    Type OwnType() const {
+        return std::visit([](auto m) { return TypeOf(m); }, member);
+    }
 };
-
-namespace {
-
-// The global state or the channel's, whichever the member belongs to.
-template <class T, class S, class G, class C>
-auto& Owner(T S::*, G& global, C& channel) {
-    if constexpr (std::is_same_v<S, std::remove_const_t<G>>)
-        return global;
-    else
-        return channel;
-}
-
-} // namespace
 
 const Generator::Field* Generator::FindField(ViAttr attr) {
 #define QZSCPI_FIELD(name, scope, member)                                                          \
@@ -82,10 +105,7 @@ const Generator::Field* Generator::FindField(ViAttr attr) {
 void Generator::RequireType(ViAttr attr, Type type) {
     const Field* field = FindField(attr);
     // The attributes outside the table are the memory's limits, all integers.
-    const Type own = field == nullptr                 ? Type::Int32
-                     : field->member.index() == 4     ? Type::Boolean
-                     : field->member.index() % 2 == 0 ? Type::Real64
-                                                      : Type::Int32;
+    const Type own = field != nullptr ? field->OwnType() : Type::Int32;
     if (type == own) return;
     static constexpr const char* kNames[] = {"ViInt32", "ViReal64", "ViBoolean"};
     throw StatusError(IVI_ERROR_TYPES_DO_NOT_MATCH,
