@@ -3,8 +3,8 @@
 #include "qzivi/ivi_common.h"
 
 #include <algorithm>
-#include <cmath>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 
 namespace qzivi::scpi {
