@@ -266,8 +266,9 @@ TEST_F(NetworkTest, ARefusedValueIsReportedAsTheSimulatorReportsIt) {
         << network.description;
 }
 
-// The caller's type must be the attribute's: an infinity given to an integer is refused whole.
-TEST_F(NetworkTest, AttributesOfAnotherTypeAreRefusedAsTheSimulatorRefusesThem) {
+// The caller's type must be the attribute's: an infinity given to an integer is refused whole. An
+// internal source whose frequency is refused keeps its depth too.
+TEST_F(NetworkTest, WrongTypesAndRefusedSettingsChangeNothingAsOnTheSimulator) {
     Emulator emulator;
     UseInstrumentAt(emulator.Port());
     const auto statuses = [](const char* name) {
@@ -286,13 +287,20 @@ TEST_F(NetworkTest, AttributesOfAnotherTypeAreRefusedAsTheSimulatorRefusesThem) 
             IviFgen_GetAttributeViBoolean(vi, "Channel1", IVIFGEN_ATTR_BURST_COUNT, &boolean),
             IviFgen_GetAttributeViInt32(vi, "Channel1", IVIFGEN_ATTR_OPERATION_MODE, &integer)};
         got.push_back(integer);
+        ViReal64 depth = 0;
+        IviFgen_GetAttributeViReal64(vi, "", IVIFGEN_ATTR_AM_INTERNAL_DEPTH, &depth);
+        got.push_back(IviFgen_ConfigureAMInternal(vi, depth / 2, IVIFGEN_VAL_WFM_SQUARE, 1e12));
+        IviFgen_GetAttributeViReal64(vi, "", IVIFGEN_ATTR_AM_INTERNAL_DEPTH, &real);
+        got.push_back(real == depth);
         IviFgen_close(vi);
         return got;
     };
     const auto simulated = statuses("SampleFGen");
     EXPECT_EQ(statuses("Bench"), simulated);
     EXPECT_EQ(simulated.front(), IVI_ERROR_TYPES_DO_NOT_MATCH);
-    EXPECT_EQ(simulated.back(), IVIFGEN_VAL_OPERATE_CONTINUOUS) << "the mode stayed as it was";
+    EXPECT_EQ(simulated[7], IVIFGEN_VAL_OPERATE_CONTINUOUS) << "the mode stayed as it was";
+    EXPECT_EQ(simulated[8], IVI_ERROR_INVALID_VALUE);
+    EXPECT_EQ(simulated[9], 1) << "the depth stayed as it was";
 }
 
 TEST_F(NetworkTest, ALostInstrumentIsAnErrorAndTheNextInitConnectsAgain) {
