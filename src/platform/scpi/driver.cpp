@@ -6,7 +6,7 @@
 #include "qzivi/c_boundary.h"
 #include "qzivi/ivi_common.h"
 
-#include <array>
+#include <initializer_list>
 #include <mutex>
 #include <utility>
 
@@ -50,19 +50,19 @@ ViStatus Run(ViSession vi, const char* function, Body&& body) noexcept {
     });
 }
 
-// An internal modulation source's settings, all checked before any is sent.
-ViStatus ConfigureInternalSource(ViSession vi, const char* function,
-                                 const std::array<std::pair<ViAttr, double>, 3>& settings) {
-    return Run(vi, function, [&](Generator& g) {
-        for (const auto& [attr, value] : settings)
-            g.Set(attr, "", value, true);
-        for (const auto& [attr, value] : settings)
-            g.Set(attr, "", value, false);
-    });
-}
-
 std::string Channel(ViConstString channel) {
     return channel != nullptr ? channel : "";
+}
+
+// A class function that sets attributes: every setting is checked before any is sent.
+ViStatus Configure(ViSession vi, const char* function, ViConstString channel,
+                   std::initializer_list<std::pair<ViAttr, double>> settings) {
+    return Run(vi, function, [&](Generator& g) {
+        for (const auto& [attr, value] : settings)
+            g.Set(attr, Channel(channel), value, true);
+        for (const auto& [attr, value] : settings)
+            g.Set(attr, Channel(channel), value, false);
+    });
 }
 
 // The field of an *IDN? answer: 0 the maker, 1 the model.
@@ -244,33 +244,30 @@ QZSCPI_SET_AND_CHECK(ViBoolean, Boolean)
 #undef QZSCPI_SET_AND_CHECK
 
 ViStatus QZScpiFgen_ConfigureOutputMode(ViSession vi, ViInt32 outputMode) {
-    return Run(vi, "ConfigureOutputMode",
-               [&](Generator& g) { g.Set(IVIFGEN_ATTR_OUTPUT_MODE, "", outputMode, false); });
+    return Configure(vi, "ConfigureOutputMode", nullptr,
+                     {{IVIFGEN_ATTR_OUTPUT_MODE, double(outputMode)}});
 }
 
 ViStatus QZScpiFgen_ConfigureRefClockSource(ViSession vi, ViInt32 source) {
-    return Run(vi, "ConfigureRefClockSource",
-               [&](Generator& g) { g.Set(IVIFGEN_ATTR_REF_CLOCK_SOURCE, "", source, false); });
+    return Configure(vi, "ConfigureRefClockSource", nullptr,
+                     {{IVIFGEN_ATTR_REF_CLOCK_SOURCE, double(source)}});
 }
 
 ViStatus QZScpiFgen_ConfigureOutputImpedance(ViSession vi, ViConstString channel,
                                              ViReal64 impedance) {
-    return Run(vi, "ConfigureOutputImpedance", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_OUTPUT_IMPEDANCE, Channel(channel), impedance, false);
-    });
+    return Configure(vi, "ConfigureOutputImpedance", channel,
+                     {{IVIFGEN_ATTR_OUTPUT_IMPEDANCE, impedance}});
 }
 
 ViStatus QZScpiFgen_ConfigureOperationMode(ViSession vi, ViConstString channel,
                                            ViInt32 operationMode) {
-    return Run(vi, "ConfigureOperationMode", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_OPERATION_MODE, Channel(channel), operationMode, false);
-    });
+    return Configure(vi, "ConfigureOperationMode", channel,
+                     {{IVIFGEN_ATTR_OPERATION_MODE, double(operationMode)}});
 }
 
 ViStatus QZScpiFgen_ConfigureOutputEnabled(ViSession vi, ViConstString channel, ViBoolean enabled) {
-    return Run(vi, "ConfigureOutputEnabled", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_OUTPUT_ENABLED, Channel(channel), enabled != VI_FALSE, false);
-    });
+    return Configure(vi, "ConfigureOutputEnabled", channel,
+                     {{IVIFGEN_ATTR_OUTPUT_ENABLED, double(enabled != VI_FALSE)}});
 }
 
 ViStatus QZScpiFgen_ConfigureStandardWaveform(ViSession vi, ViConstString channel, ViInt32 waveform,
@@ -314,8 +311,8 @@ ViStatus QZScpiFgen_ConfigureArbWaveform(ViSession vi, ViConstString channel, Vi
 }
 
 ViStatus QZScpiFgen_ConfigureSampleRate(ViSession vi, ViReal64 sampleRate) {
-    return Run(vi, "ConfigureSampleRate",
-               [&](Generator& g) { g.Set(IVIFGEN_ATTR_ARB_SAMPLE_RATE, "", sampleRate, false); });
+    return Configure(vi, "ConfigureSampleRate", nullptr,
+                     {{IVIFGEN_ATTR_ARB_SAMPLE_RATE, sampleRate}});
 }
 
 ViStatus QZScpiFgen_QueryArbSeqCapabilities(ViSession vi, ViInt32* maxNumSequences,
@@ -349,14 +346,13 @@ ViStatus QZScpiFgen_ConfigureArbSequence(ViSession vi, ViConstString channel, Vi
 }
 
 ViStatus QZScpiFgen_ConfigureTriggerSource(ViSession vi, ViConstString channel, ViInt32 source) {
-    return Run(vi, "ConfigureTriggerSource", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_TRIGGER_SOURCE, Channel(channel), source, false);
-    });
+    return Configure(vi, "ConfigureTriggerSource", channel,
+                     {{IVIFGEN_ATTR_TRIGGER_SOURCE, double(source)}});
 }
 
 ViStatus QZScpiFgen_ConfigureInternalTriggerRate(ViSession vi, ViReal64 rate) {
-    return Run(vi, "ConfigureInternalTriggerRate",
-               [&](Generator& g) { g.Set(IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, "", rate, false); });
+    return Configure(vi, "ConfigureInternalTriggerRate", nullptr,
+                     {{IVIFGEN_ATTR_INTERNAL_TRIGGER_RATE, rate}});
 }
 
 ViStatus QZScpiFgen_SendSoftwareTrigger(ViSession vi) {
@@ -364,49 +360,42 @@ ViStatus QZScpiFgen_SendSoftwareTrigger(ViSession vi) {
 }
 
 ViStatus QZScpiFgen_ConfigureBurstCount(ViSession vi, ViConstString channel, ViInt32 count) {
-    return Run(vi, "ConfigureBurstCount", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_BURST_COUNT, Channel(channel), count, false);
-    });
+    return Configure(vi, "ConfigureBurstCount", channel,
+                     {{IVIFGEN_ATTR_BURST_COUNT, double(count)}});
 }
 
 ViStatus QZScpiFgen_ConfigureAMEnabled(ViSession vi, ViConstString channel, ViBoolean enabled) {
-    return Run(vi, "ConfigureAMEnabled", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_AM_ENABLED, Channel(channel), enabled != VI_FALSE, false);
-    });
+    return Configure(vi, "ConfigureAMEnabled", channel,
+                     {{IVIFGEN_ATTR_AM_ENABLED, double(enabled != VI_FALSE)}});
 }
 
 ViStatus QZScpiFgen_ConfigureAMSource(ViSession vi, ViConstString channel, ViInt32 source) {
-    return Run(vi, "ConfigureAMSource", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_AM_SOURCE, Channel(channel), source, false);
-    });
+    return Configure(vi, "ConfigureAMSource", channel, {{IVIFGEN_ATTR_AM_SOURCE, double(source)}});
 }
 
 ViStatus QZScpiFgen_ConfigureAMInternal(ViSession vi, ViReal64 depth, ViInt32 waveform,
                                         ViReal64 frequency) {
-    return ConfigureInternalSource(vi, "ConfigureAMInternal",
-                                   {{{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, depth},
-                                     {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, double(waveform)},
-                                     {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, frequency}}});
+    return Configure(vi, "ConfigureAMInternal", nullptr,
+                     {{IVIFGEN_ATTR_AM_INTERNAL_DEPTH, depth},
+                      {IVIFGEN_ATTR_AM_INTERNAL_WAVEFORM, double(waveform)},
+                      {IVIFGEN_ATTR_AM_INTERNAL_FREQUENCY, frequency}});
 }
 
 ViStatus QZScpiFgen_ConfigureFMEnabled(ViSession vi, ViConstString channel, ViBoolean enabled) {
-    return Run(vi, "ConfigureFMEnabled", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_FM_ENABLED, Channel(channel), enabled != VI_FALSE, false);
-    });
+    return Configure(vi, "ConfigureFMEnabled", channel,
+                     {{IVIFGEN_ATTR_FM_ENABLED, double(enabled != VI_FALSE)}});
 }
 
 ViStatus QZScpiFgen_ConfigureFMSource(ViSession vi, ViConstString channel, ViInt32 source) {
-    return Run(vi, "ConfigureFMSource", [&](Generator& g) {
-        g.Set(IVIFGEN_ATTR_FM_SOURCE, Channel(channel), source, false);
-    });
+    return Configure(vi, "ConfigureFMSource", channel, {{IVIFGEN_ATTR_FM_SOURCE, double(source)}});
 }
 
 ViStatus QZScpiFgen_ConfigureFMInternal(ViSession vi, ViReal64 deviation, ViInt32 waveform,
                                         ViReal64 frequency) {
-    return ConfigureInternalSource(vi, "ConfigureFMInternal",
-                                   {{{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, deviation},
-                                     {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, double(waveform)},
-                                     {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, frequency}}});
+    return Configure(vi, "ConfigureFMInternal", nullptr,
+                     {{IVIFGEN_ATTR_FM_INTERNAL_DEVIATION, deviation},
+                      {IVIFGEN_ATTR_FM_INTERNAL_WAVEFORM, double(waveform)},
+                      {IVIFGEN_ATTR_FM_INTERNAL_FREQUENCY, frequency}});
 }
 
 ViStatus QZScpiFgen_InitiateGeneration(ViSession vi) {
