@@ -1,10 +1,19 @@
 #!/usr/bin/env bash
 # Builds the libFuzzer targets with clang and runs each from its seed corpus.
-#   fuzz.sh [runs]        (default 10000000 runs a target; CI gives a small number)
+#   fuzz.sh [runs] [target...]   (default 10000000 runs of every target; CI gives a small number)
+# A short run (CI's) is the same every time: a fixed seed, new finds to a scratch folder, one
+# target after another. A long run keeps what it finds in build/fuzz/corpus-<target>, so that
+# nights add up, takes a new seed each time, and runs as many targets at once as there are
+# cores, each logging to build/fuzz/<target>.log.
 # A crash leaves its input as fuzz/crash-* and stops with the target's report.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 runs=${1:-10000000}
+shift || true
+targets=("$@")
+[ ${#targets[@]} -gt 0 ] || targets=(bag qzc store numbers data_file scpi)
+long=$((runs > 100000))
+
 CC=clang CXX=clang++ cmake -S . -B build/fuzz -G Ninja -DQZIVI_FUZZ=ON -DQZIVI_BUILD_QT=OFF \
   -DQZIVI_BUILD_TESTS=OFF -DQZIVI_BUILD_BENCH=OFF -DQZIVI_BUILD_PYTHON=OFF \
   -DCMAKE_BUILD_TYPE=RelWithDebInfo >/dev/null
@@ -14,14 +23,48 @@ if ! cmake --build build/fuzz -j 2 >build/fuzz-build.log 2>&1; then
   exit 1
 fi
 export QZIVI_SESSION_MANAGER=none
-for target in bag qzc store numbers data_file scpi; do
-  work=$(mktemp -d)
+
+fuzz() {
+  local target=$1 work seed=1 max_len=65536
+  # A .qzc beyond 8 kB only repeats what a smaller one holds, at its size in every run.
+  [ "$target" = qzc ] && max_len=8192
+  if [ "$long" = 1 ]; then
+    work=build/fuzz/corpus-$target
+    seed=0 # libFuzzer picks one and prints it
+    mkdir -p "$work"
+  else
+    work=$(mktemp -d) # the seeds are read, not written to
+  fi
+  local status=0
+  build/fuzz/fuzz/fuzz_$target -seed=$seed -runs="$runs" -max_len=$max_len \
+    -artifact_prefix=fuzz/crash-$target- -print_final_stats=1 "$work" fuzz/corpus/$target 2>&1 ||
+    status=$?
+  [ "$long" = 1 ] || rm -rf "$work"
+  return $status
+}
+
+summary() { grep -E "Seed:|stat::number_of_executed_units|ERROR|SUMMARY|Done" || true; }
+crashed() {
+  if ls fuzz/crash-$1-* >/dev/null 2>&1; then echo "fuzz_$1 crashed"; else return 1; fi
+}
+
+if [ "$long" = 1 ]; then
+  for target in "${targets[@]}"; do
+    while [ "$(jobs -rp | wc -l)" -ge "$(nproc)" ]; do wait -n || true; done
+    echo "== fuzz_$target: $runs runs, log in build/fuzz/$target.log"
+    fuzz "$target" >"build/fuzz/$target.log" 2>&1 &
+  done
+  wait
+  status=0
+  for target in "${targets[@]}"; do
+    echo "== fuzz_$target"
+    summary <"build/fuzz/$target.log"
+    if crashed "$target"; then status=1; fi
+  done
+  exit $status
+fi
+for target in "${targets[@]}"; do
   echo "== fuzz_$target: $runs runs"
-  # The seeds are read, not written to: new finds go to a scratch folder.
-  # A fixed seed: the short CI runs are the same every time.
-  build/fuzz/fuzz/fuzz_$target -seed=1 -runs="$runs" -max_len=65536 -artifact_prefix=fuzz/crash-$target- \
-    -print_final_stats=1 "$work" fuzz/corpus/$target 2>&1 |
-    grep -E "stat::number_of_executed_units|ERROR|SUMMARY|Done" || true
-  rm -rf "$work"
-  if ls fuzz/crash-$target-* >/dev/null 2>&1; then echo "fuzz_$target crashed"; exit 1; fi
+  fuzz "$target" | summary || true
+  if crashed "$target"; then exit 1; fi
 done
