@@ -14,35 +14,6 @@ namespace qzivi::scpi {
 
 using ivi::StatusError;
 
-namespace {
-
-template <class M>
-struct MemberOf;
-template <class T, class S>
-struct MemberOf<T S::*> {
-    using Owner = S;
-    using Type = T;
-};
-
-// The global state or the channel's, whichever the member belongs to.
-template <class M, class G, class C>
-auto& Owner(M, G& global, C& channel) {
-    if constexpr (std::is_same_v<typename MemberOf<M>::Owner, std::remove_const_t<G>>)
-        return global;
-    else
-        return channel;
-}
-
-template <class M>
-constexpr Generator::Type TypeOf(M) {
-    using T = typename MemberOf<M>::Type;
-    return std::is_same_v<T, bool>     ? Generator::Type::Boolean
-           : std::is_same_v<T, double> ? Generator::Type::Real64
-                                       : Generator::Type::Int32;
-}
-
-} // namespace
-
 struct Generator::Field {
     ViAttr attr;
     const char* word;
@@ -50,10 +21,32 @@ struct Generator::Field {
                  bool Channel::*>
         member;
 
+    // The piece of state a member is: the global state's or the channel's, const or not.
+    template <class T, class G, class C>
+    static auto& Slot(T Global::*m, G& global, C&) {
+        return global.*m;
+    }
+    template <class T, class G, class C>
+    static auto& Slot(T Channel::*m, G&, C& channel) {
+        return channel.*m;
+    }
+    template <class T>
+    static constexpr bool InGlobal(T Global::*) {
+        return true;
+    }
+    template <class T>
+    static constexpr bool InGlobal(T Channel::*) {
+        return false;
+    }
+    template <class T, class S>
+    static constexpr Type TypeOf(T S::*) {
+        return std::is_same_v<T, bool>     ? Type::Boolean
+               : std::is_same_v<T, double> ? Type::Real64
+                                           : Type::Int32;
+    }
+
     bool IsGlobal() const {
-        return std::visit(
-            [](auto m) { return std::is_same_v<typename MemberOf<decltype(m)>::Owner, Global>; },
-            member);
+        return std::visit([](auto m) { return InGlobal(m); }, member);
     }
     Type OwnType() const {
         return std::visit([](auto m) { return TypeOf(m); }, member);
@@ -140,7 +133,7 @@ double Generator::Get(ViAttr attr, const std::string& channel) const {
                           "attribute " + std::to_string(attr) + " is not supported");
     const Channel& c = channels_[field->IsGlobal() ? 0 : std::size_t(Index(channel))];
     return std::visit(
-        [&](auto member) { return static_cast<double>(Owner(member, global_, c).*member); },
+        [&](auto member) { return static_cast<double>(Field::Slot(member, global_, c)); },
         field->member);
 }
 
@@ -162,7 +155,7 @@ void Generator::Set(ViAttr attr, const std::string& channel, double value, bool 
     const int index = field->IsGlobal() ? -1 : Index(channel);
     std::visit(
         [&](auto member) {
-            auto& slot = Owner(member, g, channels[std::size_t(std::max(index, 0))]).*member;
+            auto& slot = Field::Slot(member, g, channels[std::size_t(std::max(index, 0))]);
             using T = std::remove_reference_t<decltype(slot)>;
             if constexpr (std::is_same_v<T, bool>)
                 slot = value != 0;
