@@ -23,6 +23,9 @@ if ! cmake --build build/fuzz -j 2 >build/fuzz-build.log 2>&1; then
   exit 1
 fi
 export QZIVI_SESSION_MANAGER=none
+# A long run spares ASan the stack it records at every allocation (a seventh of fuzz_qzc's
+# time); to see where a crash's memory came from, run its target on the crash file alone.
+[ "$long" = 1 ] && export ASAN_OPTIONS=${ASAN_OPTIONS:-malloc_context_size=0}
 
 fuzz() {
   local target=$1 work seed=1 max_len=65536

@@ -3,6 +3,7 @@
 #include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 
+#include <array>
 #include <bit>
 #include <cstring>
 
@@ -101,8 +102,16 @@ bool operator==(const SharedBytes& a, const SharedBytes& b) {
 }
 
 namespace {
-char Fold(char c) {
-    return c >= 'A' && c <= 'Z' ? static_cast<char>(c - 'A' + 'a') : c;
+// Names are hashed and compared byte by byte on every read and write of the tree; a table
+// folds a byte without a branch.
+constexpr auto kFold = [] {
+    std::array<unsigned char, 256> fold{};
+    for (std::size_t c = 0; c < fold.size(); ++c)
+        fold[c] = static_cast<unsigned char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
+    return fold;
+}();
+unsigned char Fold(char c) {
+    return kFold[static_cast<unsigned char>(c)];
 }
 bool SameName(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
@@ -115,7 +124,7 @@ bool SameName(std::string_view a, std::string_view b) {
 std::uint64_t PropertyBag::Hash(std::string_view name) {
     std::uint64_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
     for (const char c : name)
-        hash = (hash ^ static_cast<unsigned char>(Fold(c))) * 1099511628211ull;
+        hash = (hash ^ Fold(c)) * 1099511628211ull;
     return hash ^ (hash >> 29);
 }
 

@@ -124,17 +124,26 @@ void PutDefaults(std::span<const PropertyRow<Owner>> rows, Owner& owner, Put put
     for (const auto& row : rows)
         if (row.put) put(owner, row, row.initial);
 }
+// One key buffer for a whole table: a tree of many items builds a key for every row of each.
 template <typename Owner, typename Put = PutAsGiven>
 void ReadRows(std::span<const PropertyRow<Owner>> rows, Owner& owner, const PropertyBag& bag,
               const std::string& prefix, Put put = {}) {
-    for (const auto& row : rows)
-        if (row.put) put(owner, row, ReadProperty(bag, prefix + std::string(row.name), row));
+    std::string key = prefix;
+    for (const auto& row : rows) {
+        if (!row.put) continue;
+        key.replace(prefix.size(), std::string::npos, row.name);
+        put(owner, row, ReadProperty(bag, key, row));
+    }
 }
 template <typename Owner>
 void WriteRows(std::span<const PropertyRow<Owner>> rows, const Owner& owner, PropertyBag& bag,
                const std::string& prefix) {
-    for (const auto& row : rows)
-        if (row.get) WriteProperty(bag, prefix + std::string(row.name), row.get(owner), row);
+    std::string key = prefix;
+    for (const auto& row : rows) {
+        if (!row.get) continue;
+        key.replace(prefix.size(), std::string::npos, row.name);
+        WriteProperty(bag, key, row.get(owner), row);
+    }
 }
 template <typename Owner, typename Put = PutAsGiven>
 void CopyRows(std::span<const PropertyRow<Owner>> rows, const Owner& from, Owner& to,
