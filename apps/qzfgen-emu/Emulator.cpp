@@ -250,14 +250,11 @@ std::string Emulator::Execute(std::string_view message) {
             int channel = 1;
             // A relative header tries the path it inherits, then the root, as the series does.
             for (std::size_t drop : {std::size_t{0}, command.carried}) {
-                const std::vector<std::string> nodes(
-                    command.nodes.begin() + static_cast<std::ptrdiff_t>(drop), command.nodes.end());
-                for (const Entry& entry : table_) {
-                    const bool common = entry.pattern[0] == '*';
-                    if (common != command.common) continue;
+                const auto nodes = std::span(command.nodes).subspan(drop);
+                for (const auto& [pattern, entry] : table_) {
+                    if (pattern.Common() != command.common) continue;
                     int suffix = 1;
-                    if (scpi::Matches(std::string_view(entry.pattern).substr(common ? 1 : 0), nodes,
-                                      &suffix) &&
+                    if (pattern.Matches(nodes, &suffix) &&
                         (command.query ? bool(entry.query) : bool(entry.set))) {
                         found = &entry;
                         channel = suffix;
@@ -283,26 +280,24 @@ std::string Emulator::Execute(std::string_view message) {
     return answers;
 }
 
-std::vector<Emulator::Entry> Emulator::Table() {
-    std::vector<Entry> t;
+std::vector<Emulator::Row> Emulator::Table() {
+    std::vector<Row> t;
     auto number = [](ViAttr attr, std::string_view unit, bool perChannel = true) {
         return Entry{
-            "", [=](Call& c) { c.SetReal(attr, c.Number(attr, unit, perChannel), perChannel); },
+            [=](Call& c) { c.SetReal(attr, c.Number(attr, unit, perChannel), perChannel); },
             [=](Call& c) { return FormatNumber(c.Real(attr, perChannel)); }};
     };
-    auto add = [&](std::string pattern, Entry entry) {
-        entry.pattern = pattern;
-        t.push_back(std::move(entry));
+    auto add = [&](std::string_view pattern, Entry entry) {
+        t.push_back({scpi::Pattern(pattern), std::move(entry)});
     };
 
     // ---- Common commands
-    add("*IDN", {"", nullptr, [](Call&) { return std::string(kIdentity); }});
-    add("*RST", {"", [](Call& c) { c.emu.Reset(); }, nullptr});
-    add("*CLS", {"", [](Call& c) { c.emu.errors_.clear(); }, nullptr});
-    add("*OPC", {"", [](Call&) {}, [](Call&) { return std::string("1"); }});
-    add("*WAI", {"", [](Call&) {}, nullptr});
-    add("*TRG", {"",
-                 [](Call& c) {
+    add("*IDN", {nullptr, [](Call&) { return std::string(kIdentity); }});
+    add("*RST", {[](Call& c) { c.emu.Reset(); }, nullptr});
+    add("*CLS", {[](Call& c) { c.emu.errors_.clear(); }, nullptr});
+    add("*OPC", {[](Call&) {}, [](Call&) { return std::string("1"); }});
+    add("*WAI", {[](Call&) {}, nullptr});
+    add("*TRG", {[](Call& c) {
                      if (IviFgen_SendSoftwareTrigger(c.emu.vi_) < 0) {
                          ViStatus code = 0;
                          ViChar text[256];
@@ -311,7 +306,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
                      }
                  },
                  nullptr});
-    add("SYSTem:ERRor[:NEXT]", {"", nullptr, [](Call& c) {
+    add("SYSTem:ERRor[:NEXT]", {nullptr, [](Call& c) {
                                     if (c.emu.errors_.empty())
                                         return std::string("+0,\"No error\"");
                                     const Error e = c.emu.errors_.front();
@@ -319,20 +314,18 @@ std::vector<Emulator::Entry> Emulator::Table() {
                                     return (e.number < 0 ? "" : "+") + std::to_string(e.number) +
                                            ",\"" + e.text + "\"";
                                 }});
-    add("SYSTem:BEEPer[:IMMediate]", {"", [](Call&) {}, nullptr});
-    add("DISPlay:TEXT[:DATA]", {"", [](Call&) {}, [](Call&) { return std::string("\"\""); }});
-    add("DISPlay:TEXT:CLEar", {"", [](Call&) {}, nullptr});
+    add("SYSTem:BEEPer[:IMMediate]", {[](Call&) {}, nullptr});
+    add("DISPlay:TEXT[:DATA]", {[](Call&) {}, [](Call&) { return std::string("\"\""); }});
+    add("DISPlay:TEXT:CLEar", {[](Call&) {}, nullptr});
     add("FORMat:BORDer",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              c.emu.swapped_ = scpi::ParseChoice(c.Param(0), {"NORMal", "SWAPped"}) == 1;
          },
          [](Call& c) { return std::string(c.emu.swapped_ ? "SWAP" : "NORM"); }});
 
     add("ROSCillator:SOURce",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const std::size_t i = scpi::ParseChoice(c.Param(0), {"INTernal", "EXTernal"});
              c.SetInt(IVIFGEN_ATTR_REF_CLOCK_SOURCE,
@@ -348,8 +341,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
 
     // ---- The function and its settings
     add("[SOURce#:]FUNCtion[:SHAPe]",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const std::size_t index = scpi::ParseChoice(c.Param(0), kFunctions);
              if (kWaveformOf[index] == 0 && kFunctions[index] != "ARB")
@@ -369,8 +361,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
             return c.Real(IVIFGEN_ATTR_FUNC_DC_OFFSET) +
                    side * c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE) / 2;
         };
-        return Entry{"",
-                     [=](Call& c) {
+        return Entry{[=](Call& c) {
                          c.Count(1);
                          const double other = level(c) - side * c.Real(IVIFGEN_ATTR_FUNC_AMPLITUDE);
                          const double value = scpi::ParseNumber(c.Param(0), -5, 5, level(c), "V");
@@ -382,8 +373,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
     add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:HIGH", edge(+1));
     add("[SOURce#:]VOLTage[:LEVel][:IMMediate]:LOW", edge(-1));
     add("[SOURce#:]VOLTage:UNIT",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              if (scpi::ParseChoice(c.Param(0), {"VPP", "VRMS", "DBM"}) != 0)
                  throw Error{-221, "Settings conflict;this emulator sets amplitudes in Vpp only"};
@@ -391,8 +381,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
          [](Call&) { return std::string("VPP"); }});
     add("[SOURce#:]FUNCtion:SQUare:DCYCle", number(IVIFGEN_ATTR_FUNC_DUTY_CYCLE_HIGH, "PCT"));
     add("[SOURce#:]FUNCtion:RAMP:SYMMetry",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const double symmetry = scpi::ParseNumber(c.Param(0), 0, 100, 100, "PCT");
              if (symmetry != 0 && symmetry != 100)
@@ -408,14 +397,12 @@ std::vector<Emulator::Entry> Emulator::Table() {
 
     // ---- Output
     add("OUTPut#[:STATe]",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              c.SetBool(IVIFGEN_ATTR_OUTPUT_ENABLED, scpi::ParseBoolean(c.Param(0)));
          },
          [](Call& c) { return Call::Flag(c.Bool(IVIFGEN_ATTR_OUTPUT_ENABLED)); }});
-    add("OUTPut#:LOAD", {"",
-                         [](Call& c) {
+    add("OUTPut#:LOAD", {[](Call& c) {
                              c.Count(1);
                              const Parameter& p = c.Param(0);
                              const bool infinite =
@@ -432,8 +419,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
                                         ? FormatNumber(9.9e37)
                                         : FormatNumber(c.Real(IVIFGEN_ATTR_OUTPUT_IMPEDANCE));
                          }});
-    add("OUTPut#:TRIGger[:STATe]", {"",
-                                    [](Call& c) {
+    add("OUTPut#:TRIGger[:STATe]", {[](Call& c) {
                                         c.Count(1);
                                         scpi::ParseBoolean(c.Param(0));
                                     },
@@ -441,8 +427,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
 
     // ---- Arbitrary waveforms and sequences
     add("[SOURce#:]DATA:VOLatile:CLEar",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              // This channel's memory; the simulator's copies of its waveforms are let go.
              auto& waveforms = c.emu.waveforms_[c.channel - 1];
              auto& sequences = c.emu.sequences_[c.channel - 1];
@@ -487,11 +472,10 @@ std::vector<Emulator::Entry> Emulator::Table() {
             waveforms[name] = handle;
         };
     };
-    add("[SOURce#:]DATA:ARBitrary", {"", upload(false), nullptr});
-    add("[SOURce#:]DATA:ARBitrary:DAC", {"", upload(true), nullptr});
+    add("[SOURce#:]DATA:ARBitrary", {upload(false), nullptr});
+    add("[SOURce#:]DATA:ARBitrary:DAC", {upload(true), nullptr});
     add("[SOURce#:]DATA:SEQuence",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const Parameter& block = c.Param(0);
              if (block.kind != ParamKind::Block) throw Error{-104, "Data type error"};
@@ -527,8 +511,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
          },
          nullptr});
     add("[SOURce#:]FUNCtion:ARBitrary",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const std::string name = ArbName(c.Param(0));
              if (c.emu.waveforms_[c.channel - 1].count(name) == 0 &&
@@ -540,15 +523,13 @@ std::vector<Emulator::Entry> Emulator::Table() {
          [](Call& c) { return "\"" + c.emu.channels_[c.channel - 1].arb + "\""; }});
     add("[SOURce#:]FUNCtion:ARBitrary:SRATe", number(IVIFGEN_ATTR_ARB_SAMPLE_RATE, "SA/S", false));
     add("[SOURce#:]FUNCtion:ARBitrary:ADVance",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              scpi::ParseChoice(c.Param(0), {"SRATe", "TRIGger"});
          },
          [](Call&) { return std::string("SRAT"); }});
     add("[SOURce#:]FUNCtion:ARBitrary:FILTer",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              scpi::ParseChoice(c.Param(0), {"NORMal", "STEP", "OFF"});
          },
@@ -556,8 +537,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
 
     // ---- Trigger and burst
     add("TRIGger#:SOURce",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              static const ViInt32 kSources[] = {IVIFGEN_VAL_INTERNAL_TRIGGER, IVIFGEN_VAL_EXTERNAL,
                                                 IVIFGEN_VAL_SOFTWARE_TRIG,
@@ -577,8 +557,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
              }
          }});
     add("[SOURce#:]BURSt:STATe",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const bool on = scpi::ParseBoolean(c.Param(0));
              c.SetInt(IVIFGEN_ATTR_OPERATION_MODE,
@@ -591,16 +570,14 @@ std::vector<Emulator::Entry> Emulator::Table() {
              return Call::Flag(c.Int(IVIFGEN_ATTR_OPERATION_MODE) == IVIFGEN_VAL_OPERATE_BURST);
          }});
     add("[SOURce#:]BURSt:MODE",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              if (scpi::ParseChoice(c.Param(0), {"TRIGgered", "GATed"}) != 0)
                  throw Error{-221, "Settings conflict;this emulator bursts on triggers only"};
          },
          [](Call&) { return std::string("TRIG"); }});
     add("[SOURce#:]BURSt:NCYCles",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const double cycles = scpi::ParseNumber(c.Param(0), 1, 100000000, 1);
              if (cycles < 1 || cycles > 100000000) throw Error{-222, "Data out of range"};
@@ -608,8 +585,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
          },
          [](Call& c) { return FormatNumber(c.Int(IVIFGEN_ATTR_BURST_COUNT)); }});
     add("[SOURce#:]BURSt:INTernal:PERiod",
-        {"",
-         [](Call& c) {
+        {[](Call& c) {
              c.Count(1);
              const double period = scpi::ParseNumber(c.Param(0), 1e-6, 8000, 10e-3, "S");
              if (period < 1e-6 || period > 8000) throw Error{-222, "Data out of range"};
@@ -623,15 +599,13 @@ std::vector<Emulator::Entry> Emulator::Table() {
                           const char* amountUnit, ViAttr shape, ViAttr frequency) {
         const std::string base = std::string("[SOURce#:]") + am;
         auto pattern = [&](const char* tail) { return base + tail; };
-        add(pattern(":STATe"), {"",
-                                [=](Call& c) {
+        add(pattern(":STATe"), {[=](Call& c) {
                                     c.Count(1);
                                     c.SetBool(enabled, scpi::ParseBoolean(c.Param(0)));
                                 },
                                 [=](Call& c) { return Call::Flag(c.Bool(enabled)); }});
         add(pattern(":SOURce"),
-            {"",
-             [=](Call& c) {
+            {[=](Call& c) {
                  c.Count(1);
                  const std::size_t i =
                      scpi::ParseChoice(c.Param(0), {"INTernal", "EXTernal", "CH1", "CH2"});
@@ -643,11 +617,10 @@ std::vector<Emulator::Entry> Emulator::Table() {
                  return std::string(c.Int(source) == IVIFGEN_VAL_AM_INTERNAL ? "INT" : "EXT");
              }});
         add(pattern(amountUnit[0] == 'P' ? ":DEPTh" : ":DEViation"),
-            {"", [=](Call& c) { c.SetReal(amount, c.Number(amount, amountUnit, false), false); },
+            {[=](Call& c) { c.SetReal(amount, c.Number(amount, amountUnit, false), false); },
              [=](Call& c) { return FormatNumber(c.Real(amount, false)); }});
         add(pattern(":INTernal:FUNCtion"),
-            {"",
-             [=](Call& c) {
+            {[=](Call& c) {
                  c.Count(1);
                  c.SetInt(shape, kShapeOf[scpi::ParseChoice(c.Param(0), kShapes)], false);
              },
@@ -658,7 +631,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
                  return std::string("SIN");
              }});
         add(pattern(":INTernal:FREQuency"),
-            {"", [=](Call& c) { c.SetReal(frequency, c.Number(frequency, "HZ", false), false); },
+            {[=](Call& c) { c.SetReal(frequency, c.Number(frequency, "HZ", false), false); },
              [=](Call& c) { return FormatNumber(c.Real(frequency, false)); }});
     };
     modulation("AM", IVIFGEN_ATTR_AM_ENABLED, IVIFGEN_ATTR_AM_SOURCE,
@@ -670,7 +643,7 @@ std::vector<Emulator::Entry> Emulator::Table() {
 
     // ---- The emulator's own: what the outputs carry, seconds after generation began.
     add("[SOURce#:]EMULator:RENDer",
-        {"", nullptr, [](Call& c) {
+        {nullptr, [](Call& c) {
              c.Count(3);
              const double start = scpi::ParseNumber(c.Param(0), 0, 0, 0, "S");
              const double step = scpi::ParseNumber(c.Param(1), 0, 0, 0, "S");

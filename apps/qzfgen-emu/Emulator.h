@@ -33,9 +33,12 @@ public:
 private:
     struct Call; // one command as its handler sees it
     struct Entry {
-        std::string pattern;
         std::function<void(Call&)> set;
         std::function<std::string(Call&)> query;
+    };
+    struct Row {
+        scpi::Pattern pattern;
+        Entry entry;
     };
 
     void Open();
@@ -44,7 +47,7 @@ private:
     // Runs a driver call; a refusal becomes an SCPI error carrying the driver's own message.
     void Check(ViStatus status);
     std::string Channel(int number) const;
-    std::vector<Entry> Table();
+    std::vector<Row> Table();
 
     // Per channel what the driver does not keep in the instrument's terms.
     struct ChannelState {
@@ -58,7 +61,7 @@ private:
 
     std::string logicalName_;
     ViSession vi_ = 0;
-    std::vector<Entry> table_;
+    std::vector<Row> table_;
     std::deque<scpi::Error> errors_;
     // Each channel's volatile memory, by upper-case name, as the series keeps one a channel.
     std::map<std::string, ViInt32> waveforms_[2];

@@ -126,10 +126,7 @@ std::string ReadNode(std::string_view node) {
     return Upper(node);
 }
 
-struct PatternNode {
-    std::string shortForm, longForm;
-    bool suffix = false, optional = false;
-};
+using PatternNode = Pattern::Node;
 
 std::vector<PatternNode> ReadPattern(std::string_view pattern) {
     std::vector<PatternNode> nodes;
@@ -162,11 +159,11 @@ std::vector<PatternNode> ReadPattern(std::string_view pattern) {
     return nodes;
 }
 
-bool NodeMatches(const PatternNode& p, const std::string& node, int* suffix) {
+bool NodeMatches(const PatternNode& p, std::string_view node, int* suffix) {
     std::size_t letters = 0;
     while (letters < node.size() && !IsDigit(node[letters]))
         ++letters;
-    const std::string_view word(node.data(), letters);
+    const std::string_view word = node.substr(0, letters);
     if (word != p.shortForm && word != p.longForm) return false;
     if (letters == node.size()) {
         if (p.suffix && suffix != nullptr) *suffix = 1;
@@ -181,14 +178,15 @@ bool NodeMatches(const PatternNode& p, const std::string& node, int* suffix) {
     return true;
 }
 
-bool MatchFrom(const std::vector<PatternNode>& pattern, std::size_t pi,
-               const std::vector<std::string>& nodes, std::size_t ni, int* suffix) {
-    if (pi == pattern.size()) return ni == nodes.size();
-    if (pattern[pi].optional && MatchFrom(pattern, pi + 1, nodes, ni, suffix)) return true;
+bool MatchFrom(std::span<const PatternNode> pattern, std::span<const std::string> nodes,
+               int* suffix) {
+    if (pattern.empty()) return nodes.empty();
+    const PatternNode& first = pattern.front();
+    if (first.optional && MatchFrom(pattern.subspan(1), nodes, suffix)) return true;
     int value = 0;
-    if (ni < nodes.size() && NodeMatches(pattern[pi], nodes[ni], &value) &&
-        MatchFrom(pattern, pi + 1, nodes, ni + 1, suffix)) {
-        if (pattern[pi].suffix && suffix != nullptr) *suffix = value;
+    if (!nodes.empty() && NodeMatches(first, nodes.front(), &value) &&
+        MatchFrom(pattern.subspan(1), nodes.subspan(1), suffix)) {
+        if (first.suffix && suffix != nullptr) *suffix = value;
         return true;
     }
     return false;
@@ -294,9 +292,13 @@ Parsed ParseMessage(std::string_view message) {
     return parsed;
 }
 
-bool Matches(std::string_view pattern, const std::vector<std::string>& nodes, int* suffix) {
+Pattern::Pattern(std::string_view notation)
+    : nodes_(ReadPattern(notation.substr(notation.starts_with('*') ? 1 : 0))),
+      common_(notation.starts_with('*')) {}
+
+bool Pattern::Matches(std::span<const std::string> nodes, int* suffix) const {
     int value = 1;
-    if (!MatchFrom(ReadPattern(pattern), 0, nodes, 0, &value)) return false;
+    if (!MatchFrom(nodes_, nodes, &value)) return false;
     if (suffix != nullptr) *suffix = value;
     return true;
 }

@@ -8,6 +8,7 @@
 
 #include <cstdint>
 #include <optional>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -68,9 +69,25 @@ struct Parsed {
 };
 Parsed ParseMessage(std::string_view message);
 
-// Whether `nodes` match `pattern`; `suffix` gets the number of the node marked '#' (1 when none
-// was given), or stays as it was.
-bool Matches(std::string_view pattern, const std::vector<std::string>& nodes, int* suffix);
+// A header pattern, read once: every command is held against every pattern of the table.
+class Pattern {
+public:
+    explicit Pattern(std::string_view notation);
+    // A common command's pattern ("*IDN"); its nodes are those after the '*'.
+    bool Common() const { return common_; }
+    // Whether `nodes` match; `suffix` gets the number of the node marked '#' (1 when none was
+    // given), or stays as it was.
+    bool Matches(std::span<const std::string> nodes, int* suffix) const;
+
+    struct Node {
+        std::string shortForm, longForm;
+        bool suffix = false, optional = false;
+    };
+
+private:
+    std::vector<Node> nodes_;
+    bool common_ = false;
+};
 
 // A number, a unit-prefixed number ("1 KHZ", "5mV") or MIN, MAX, DEF: `minimum`, `maximum` and
 // `fallback` stand for the words. Throws Error -104 for no number, -131 for a wrong suffix.

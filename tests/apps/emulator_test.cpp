@@ -44,14 +44,18 @@ TEST(ScpiGrammar, HeadersMatchShortOrLongFormsInAnyCaseWithOptionalNodes) {
         return scpi::ParseMessage(message).commands.at(0).nodes;
     };
     int suffix = 0;
-    const char* pattern = "[SOURce#:]VOLTage[:LEVel]:OFFSet";
-    EXPECT_TRUE(scpi::Matches(pattern, nodes("volt:offs 1"), &suffix));
+    const scpi::Pattern pattern("[SOURce#:]VOLTage[:LEVel]:OFFSet");
+    EXPECT_TRUE(pattern.Matches(nodes("volt:offs 1"), &suffix));
     EXPECT_EQ(suffix, 1);
-    EXPECT_TRUE(scpi::Matches(pattern, nodes("SOURce2:VOLTAGE:level:OFFSET 1"), &suffix));
+    EXPECT_TRUE(pattern.Matches(nodes("SOURce2:VOLTAGE:level:OFFSET 1"), &suffix));
     EXPECT_EQ(suffix, 2);
-    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLTA:OFFS 1"), nullptr)) << "neither form";
-    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLT2:OFFS 1"), nullptr)) << "no suffix there";
-    EXPECT_FALSE(scpi::Matches(pattern, nodes("VOLT 1"), nullptr));
+    EXPECT_FALSE(pattern.Matches(nodes("VOLTA:OFFS 1"), nullptr)) << "neither form";
+    EXPECT_FALSE(pattern.Matches(nodes("VOLT2:OFFS 1"), nullptr)) << "no suffix there";
+    EXPECT_FALSE(pattern.Matches(nodes("VOLT 1"), nullptr));
+    const scpi::Pattern common("*IDN");
+    EXPECT_TRUE(common.Common());
+    EXPECT_TRUE(common.Matches(nodes("*idn?"), nullptr));
+    EXPECT_FALSE(pattern.Common());
 
     const auto parsed = scpi::ParseMessage("SOUR2:FREQ 1 KHZ;VOLT? ; *TRG;:OUTP 'on', #13a,b");
     ASSERT_FALSE(parsed.error);
