@@ -3,7 +3,7 @@
 #include "qzivi/support/failure.h"
 #include "qzivi/support/text.h"
 
-#include <array>
+#include <algorithm>
 #include <bit>
 #include <cstring>
 
@@ -102,30 +102,42 @@ bool operator==(const SharedBytes& a, const SharedBytes& b) {
 }
 
 namespace {
-// Names are hashed and compared byte by byte on every read and write of the tree; a table
-// folds a byte without a branch.
-constexpr auto kFold = [] {
-    std::array<unsigned char, 256> fold{};
-    for (std::size_t c = 0; c < fold.size(); ++c)
-        fold[c] = static_cast<unsigned char>(c >= 'A' && c <= 'Z' ? c - 'A' + 'a' : c);
-    return fold;
-}();
-unsigned char Fold(char c) {
-    return kFold[static_cast<unsigned char>(c)];
+// Names are hashed and compared on every read and write of the tree, so eight bytes at a time:
+// a word's ASCII capitals are folded to small letters at once, other bytes kept as they are.
+constexpr std::uint64_t kEachByte = 0x0101010101010101ull;
+std::uint64_t FoldWord(std::uint64_t word) {
+    const std::uint64_t low7 = word & (kEachByte * 0x7f);
+    const std::uint64_t fromA = low7 + kEachByte * (0x80 - 'A'); // top bit: at least 'A'
+    const std::uint64_t pastZ = low7 + kEachByte * (0x7f - 'Z'); // top bit: beyond 'Z'
+    const std::uint64_t capital = ~word & (fromA ^ pastZ) & (kEachByte * 0x80);
+    return word | (capital >> 2);
+}
+// The word at `at`; a last part of under eight bytes is padded with zeros.
+std::uint64_t WordAt(std::string_view name, std::size_t at) {
+    std::uint64_t word = 0;
+    if (name.size() - at >= sizeof word)
+        std::memcpy(&word, name.data() + at, sizeof word); // one load, not a call
+    else
+        std::memcpy(&word, name.data() + at, name.size() - at);
+    return FoldWord(word);
 }
 bool SameName(std::string_view a, std::string_view b) {
     if (a.size() != b.size()) return false;
-    for (std::size_t i = 0; i < a.size(); ++i)
-        if (Fold(a[i]) != Fold(b[i])) return false;
+    for (std::size_t at = 0; at < a.size(); at += 8)
+        if (WordAt(a, at) != WordAt(b, at)) return false;
     return true;
 }
 } // namespace
 
 std::uint64_t PropertyBag::Hash(std::string_view name) {
-    std::uint64_t hash = 14695981039346656037ull; // FNV-1a over the folded bytes
-    for (const char c : name)
-        hash = (hash ^ Fold(c)) * 1099511628211ull;
-    return hash ^ (hash >> 29);
+    std::uint64_t hash = name.size();
+    for (std::size_t at = 0; at < name.size(); at += 8)
+        hash = (hash ^ WordAt(name, at)) * 0x9e3779b97f4a7c15ull;
+    // A word's high bytes reach only the high bits above; spread them to the low ones the index
+    // uses (the finalizer of splitmix64).
+    hash = (hash ^ (hash >> 30)) * 0xbf58476d1ce4e5b9ull;
+    hash = (hash ^ (hash >> 27)) * 0x94d049bb133111ebull;
+    return hash ^ (hash >> 31);
 }
 
 std::size_t PropertyBag::Probe(std::string_view name, std::uint64_t hash) const {

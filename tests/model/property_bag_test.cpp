@@ -6,7 +6,11 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include <cctype>
 #include <random>
+#include <string>
+#include <utility>
+#include <vector>
 
 namespace qzivi {
 namespace {
@@ -24,6 +28,10 @@ PropertyBag Sample() {
 TEST(PropertyBag, ReadsWhatWasWrittenAndDefaultsForTheRest) {
     const PropertyBag bag = Sample();
     EXPECT_EQ(bag.ReadInt32("channels_itemcount", 0), 2) << "names ignore case";
+    EXPECT_EQ(bag.ReadInt32("CHANNELS_ITEMCOUNT", 0), 2);
+    EXPECT_EQ(bag.ReadInt32("Channels_ItemCoun", 0), 0);
+    EXPECT_EQ(bag.ReadInt32(std::string("Channels_ItemCount\0", 19), 0), 0)
+        << "no name is padded to another";
     EXPECT_EQ(bag.ReadDouble("ArbSampleRate", 0), 2.5e6);
     EXPECT_FALSE(bag.ReadBool("AutoStopStart", true));
     EXPECT_EQ(bag.ReadText("LogicalName", ""), "Bench Fgen \xC3\xA4");
@@ -31,6 +39,35 @@ TEST(PropertyBag, ReadsWhatWasWrittenAndDefaultsForTheRest) {
     EXPECT_EQ(bag.ReadInt32("Missing", 17), 17);
     EXPECT_EQ(bag.ReadText("Missing", "x"), "x");
     EXPECT_TRUE(bag.ReadBytes("Missing").empty());
+}
+
+TEST(PropertyBag, FoldsOnlyTheAsciiCapitals) {
+    // Each pair differs by the bit that tells a capital from a small letter, at every place of
+    // a word: beside the letters ('@' 'A', 'Z' '['), and in bytes past ASCII ("\xC3\x84" is
+    // a capital, "\xC3\xA4" its small letter: this bag keeps both apart).
+    const std::vector<std::pair<std::string, std::string>> distinct = {
+        {"@", "`"},       {"[", "{"},
+        {"A@Z[", "a`z{"}, {"\xC3\x84", "\xC3\xA4"},
+        {"\xC1", "\xE1"}, {"Waveforms_Item1@", "Waveforms_Item1`"},
+        {"^_", "~\x7F"}};
+    for (const auto& [a, b] : distinct) {
+        PropertyBag bag;
+        bag.WriteInt32(a, 1, 0);
+        bag.WriteInt32(b, 2, 0);
+        EXPECT_EQ(bag.Size(), 2u) << a << " and " << b << " are two names";
+        EXPECT_EQ(bag.ReadInt32(a, 0), 1);
+        EXPECT_EQ(bag.ReadInt32(b, 0), 2);
+    }
+    PropertyBag bag;
+    const std::string name = "Sequences_Item12_Waveforms_Item345_Count";
+    bag.WriteInt32(name, 7, 0);
+    std::string other = name;
+    for (std::size_t i = 0; i < name.size(); ++i) {
+        other[i] = static_cast<char>(std::islower(static_cast<unsigned char>(name[i]))
+                                         ? std::toupper(static_cast<unsigned char>(name[i]))
+                                         : std::tolower(static_cast<unsigned char>(name[i])));
+        EXPECT_EQ(bag.ReadInt32(other, 0), 7) << other;
+    }
 }
 
 TEST(PropertyBag, KeepsNoValueEqualToItsDefault) {
