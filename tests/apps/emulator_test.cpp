@@ -2,6 +2,7 @@
 // generator, whose settings reach the simulator and so its rendered output.
 #include "Emulator.h"
 #include "Scpi.h"
+#include "Vxi11.h"
 #include "platform/test_support.h"
 
 #include <gmock/gmock.h>
@@ -160,6 +161,82 @@ TEST_F(EmulatorTest, RefusalsQueueTheirErrorsAndChangeNothing) {
     EXPECT_EQ(emu_.Execute("FREQ?;FUNC?;OUTP?"), "+1.000000000000000E+03;SIN;0");
     emu_.Execute("*TRG");
     EXPECT_EQ(Error(), "-211,\"Trigger ignored\"") << "no burst waits for the bus";
+}
+
+// VXI-11's calls as liblxi sends them are shown by the network test; here, what it does not send:
+// records in fragments, and calls that are short, strange or past their bounds.
+class Xdr {
+public:
+    Xdr& Word(std::uint32_t w) {
+        for (int shift = 24; shift >= 0; shift -= 8)
+            bytes += static_cast<char>((w >> shift) & 0xff);
+        return *this;
+    }
+    // A call's header with empty credentials and verifier.
+    static Xdr Call(std::uint32_t program, std::uint32_t version, std::uint32_t procedure) {
+        Xdr x;
+        x.Word(7).Word(0).Word(2).Word(program).Word(version).Word(procedure);
+        x.Word(0).Word(0).Word(0).Word(0);
+        return x;
+    }
+    std::string bytes;
+};
+
+// The accept status of a reply, and its first result word.
+std::pair<std::uint32_t, std::uint32_t> StatusAndFirst(const std::optional<std::string>& reply) {
+    const auto word = [&](std::size_t i) {
+        std::uint32_t w = 0;
+        for (std::size_t b = 0; b < 4; ++b)
+            w = (w << 8) | static_cast<unsigned char>(reply->at(4 * i + b));
+        return w;
+    };
+    return {word(5), reply->size() > 24 ? word(6) : ~0u};
+}
+
+TEST_F(EmulatorTest, Vxi11RefusesShortStrangeAndOversizedCalls) {
+    using namespace emu::vxi11;
+    RecordReader reader(64);
+    reader.Feed(Xdr().Word(2).bytes + "ab" + Xdr().Word(0x80000001).bytes);
+    std::string record;
+    EXPECT_EQ(reader.Next(record), RecordReader::Got::Nothing)
+        << "the last fragment is not all here";
+    reader.Feed("c");
+    ASSERT_EQ(reader.Next(record), RecordReader::Got::Record);
+    EXPECT_EQ(record, "abc");
+    reader.Feed(Xdr().Word(0x80000100).bytes);
+    EXPECT_EQ(reader.Next(record), RecordReader::Got::TooLong) << "256 bytes past a bound of 64";
+
+    const Portmapper portmapper(5555);
+    EXPECT_EQ(StatusAndFirst(portmapper.Answer(
+                  Xdr::Call(100000, 2, 3).Word(0x0607AF).Word(1).Word(6).Word(0).bytes)),
+              std::pair(0u, 5555u));
+    EXPECT_EQ(StatusAndFirst(portmapper.Answer(
+                  Xdr::Call(100000, 2, 3).Word(100003).Word(3).Word(6).Word(0).bytes)),
+              std::pair(0u, 0u))
+        << "no other program is here";
+    EXPECT_EQ(StatusAndFirst(portmapper.Answer(Xdr::Call(100000, 2, 3).Word(0x0607AF).bytes)),
+              std::pair(4u, ~0u))
+        << "arguments cut short";
+    EXPECT_EQ(StatusAndFirst(portmapper.Answer(Xdr::Call(100000, 9, 3).bytes)), std::pair(2u, 2u))
+        << "versions 2 to 4";
+    EXPECT_FALSE(portmapper.Answer(Xdr().Word(7).Word(1).bytes)) << "a reply is no call";
+    EXPECT_FALSE(portmapper.Answer("")) << "nor are no bytes";
+
+    Core core(emu_);
+    EXPECT_EQ(
+        StatusAndFirst(core.Answer(
+            Xdr::Call(0x0607AF, 1, 12).Word(9).Word(100).Word(0).Word(0).Word(0).Word(0).bytes)),
+        std::pair(0u, 4u))
+        << "a read on a link never made";
+    EXPECT_EQ(StatusAndFirst(core.Answer(Xdr::Call(0x0607AF, 1, 10)
+                                             .Word(1)
+                                             .Word(0)
+                                             .Word(0)
+                                             .Word(0xFFFFFFFF) // a device name of 4 GB
+                                             .bytes)),
+              std::pair(4u, ~0u));
+    EXPECT_EQ(StatusAndFirst(core.Answer(Xdr::Call(0x0607AF, 1, 99).bytes)), std::pair(3u, ~0u));
+    EXPECT_EQ(Error(), "+0,\"No error\"") << "none of it reached the instrument";
 }
 
 } // namespace

@@ -97,7 +97,8 @@ int Generator::Index(const std::string& channel) const {
 }
 
 std::string Generator::Query(const std::string& query) {
-    transport_->Write(query + "\n");
+    const std::string_view message[] = {query, "\n"};
+    transport_->Write(message);
     return transport_->ReadLine(kMostReply);
 }
 
@@ -106,10 +107,10 @@ void Generator::Send(const std::string& commands) {
 }
 
 void Generator::SendParts(std::initializer_list<std::string_view> parts) {
-    // Written piece by piece: a waveform's block goes out as it is, never copied into a message.
-    for (std::string_view part : parts)
-        transport_->Write(part);
-    transport_->Write(";:SYST:ERR?\n");
+    // The parts as they are: a waveform's block is not copied into a message here.
+    std::vector<std::string_view> message(parts);
+    message.push_back(";:SYST:ERR?\n");
+    transport_->Write(message);
     const std::string error = transport_->ReadLine(kMostReply);
     if (error.rfind("+0,", 0) == 0 || error.rfind("0,", 0) == 0) return;
     // Empty the queue, so the next call starts clean; the first entry is the cause.

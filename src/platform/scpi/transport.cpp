@@ -4,6 +4,7 @@
 #include "qzivi/ivi_common.h"
 
 #include <cerrno>
+#include <climits>
 #include <cstring>
 #include <fcntl.h>
 #include <lxi.h>
@@ -102,8 +103,12 @@ public:
     }
     ~Socket() override { ::close(fd_); }
 
-    void Write(std::string_view bytes) override {
+    void Write(std::span<const std::string_view> message) override {
         const auto deadline = Clock::now() + timeout_;
+        for (std::string_view bytes : message)
+            Write(bytes, deadline);
+    }
+    void Write(std::string_view bytes, Clock::time_point deadline) {
         while (!bytes.empty()) {
             const ssize_t put = ::send(fd_, bytes.data(), bytes.size(), MSG_NOSIGNAL);
             if (put > 0) {
@@ -182,8 +187,14 @@ public:
     }
     ~Vxi11() override { lxi_disconnect(device_); }
 
-    void Write(std::string_view bytes) override {
-        if (lxi_send(device_, bytes.data(), static_cast<int>(bytes.size()), timeout_) == LXI_ERROR)
+    void Write(std::span<const std::string_view> message) override {
+        // liblxi marks every write with END, which the instrument takes for the message's end:
+        // the parts go out as one.
+        std::string whole;
+        for (std::string_view part : message)
+            whole += part;
+        if (whole.size() > INT_MAX ||
+            lxi_send(device_, whole.data(), static_cast<int>(whole.size()), timeout_) == LXI_ERROR)
             throw StatusError(VI_ERROR_IO, "writing to the VXI-11 device " + where_ + " failed");
     }
     std::string ReadLine(std::size_t most) override {

@@ -7,6 +7,7 @@
 
 #include <chrono>
 #include <memory>
+#include <span>
 #include <string>
 #include <string_view>
 
@@ -25,7 +26,8 @@ Resource ParseResource(std::string_view text);
 class Transport {
 public:
     virtual ~Transport() = default;
-    virtual void Write(std::string_view bytes) = 0;
+    // One program message in the parts it was built of, the last ending in its newline.
+    virtual void Write(std::span<const std::string_view> message) = 0;
     // One reply up to its newline, without it; a reply longer than `most` bytes is an error.
     virtual std::string ReadLine(std::size_t most) = 0;
 };
