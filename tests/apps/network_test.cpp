@@ -247,6 +247,11 @@ TEST_F(NetworkTest, TriggerBurstAMAndFMConfigureOverTheNetworkAsOnTheSimulator) 
 // skipped without it) tells liblxi where the device core listens. liblxi ends every write with
 // END, so a message sent in parts, as a waveform's upload is, must go out as one.
 TEST_F(NetworkTest, OverVxi11EveryExampleRendersAsOnTheSimulator) {
+#if defined(__SANITIZE_ADDRESS__)
+    // ASan routes liblxi's xdr_string through its interceptor, which finds none: this glibc keeps
+    // Sun RPC for old programs only. The release build runs this test.
+    GTEST_SKIP() << "liblxi's RPC under the address sanitizer";
+#endif
     Emulator emulator(0, true);
     if (emulator.Port() == 0) GTEST_SKIP() << "port 111 is taken or needs root here";
     UseBench("TCPIP0::127.0.0.1::inst0::INSTR",
