@@ -229,7 +229,8 @@ MessageReader::Got MessageReader::Next(std::string& message) {
         } else if (c == '\n') {
             std::size_t length = i;
             if (length > 0 && buffer_[length - 1] == '\r') --length;
-            const bool dropped = dropping_;
+            // The bound holds however the bytes came: in one read or a byte at a time.
+            const bool dropped = dropping_ || i > most_;
             if (!dropped) message.assign(buffer_, 0, length);
             buffer_.erase(0, i + 1);
             Reset();

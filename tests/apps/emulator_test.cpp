@@ -38,6 +38,9 @@ TEST(ScpiGrammar, MessagesEndAtNewlinesOutsideStringsAndBlocks) {
     MessageReader small(8);
     EXPECT_THAT(Messages(small, "FREQ 1000000000"), ElementsAre());
     EXPECT_THAT(Messages(small, "0\n*IDN?\n"), ElementsAre("<too long>", "*IDN?"));
+    MessageReader whole(8);
+    EXPECT_THAT(Messages(whole, "FREQ 1000000000\n*IDN?\n"), ElementsAre("<too long>", "*IDN?"))
+        << "a message past the bound in one read";
 }
 
 TEST(ScpiGrammar, HeadersMatchShortOrLongFormsInAnyCaseWithOptionalNodes) {
