@@ -97,7 +97,8 @@ int Generator::Index(const std::string& channel) const {
 }
 
 std::string Generator::Query(const std::string& query) {
-    const std::string_view message[] = {query, "\n"};
+    const std::string line = query + "\n"; // one piece: one packet on the wire
+    const std::string_view message[] = {line};
     transport_->Write(message);
     return transport_->ReadLine(kMostReply);
 }

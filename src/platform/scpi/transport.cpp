@@ -106,24 +106,7 @@ public:
     void Write(std::span<const std::string_view> message) override {
         const auto deadline = Clock::now() + timeout_;
         for (std::string_view bytes : message)
-            Write(bytes, deadline);
-    }
-    void Write(std::string_view bytes, Clock::time_point deadline) {
-        while (!bytes.empty()) {
-            const ssize_t put = ::send(fd_, bytes.data(), bytes.size(), MSG_NOSIGNAL);
-            if (put > 0) {
-                bytes.remove_prefix(static_cast<std::size_t>(put));
-                continue;
-            }
-            if (put < 0 && errno == EINTR) continue;
-            if (put < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
-                if (!Wait(fd_, POLLOUT, deadline))
-                    throw StatusError(VI_ERROR_TMO, "writing to " + where_ + " timed out");
-                continue;
-            }
-            throw StatusError(VI_ERROR_CONN_LOST,
-                              "the connection to " + where_ + " was lost: " + std::strerror(errno));
-        }
+            Send(bytes, deadline);
     }
 
     // The time-out bounds the whole reply, however slowly its bytes trickle in.
@@ -156,6 +139,24 @@ public:
     }
 
 private:
+    void Send(std::string_view bytes, Clock::time_point deadline) {
+        while (!bytes.empty()) {
+            const ssize_t put = ::send(fd_, bytes.data(), bytes.size(), MSG_NOSIGNAL);
+            if (put > 0) {
+                bytes.remove_prefix(static_cast<std::size_t>(put));
+                continue;
+            }
+            if (put < 0 && errno == EINTR) continue;
+            if (put < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
+                if (!Wait(fd_, POLLOUT, deadline))
+                    throw StatusError(VI_ERROR_TMO, "writing to " + where_ + " timed out");
+                continue;
+            }
+            throw StatusError(VI_ERROR_CONN_LOST,
+                              "the connection to " + where_ + " was lost: " + std::strerror(errno));
+        }
+    }
+
     int fd_;
     std::chrono::milliseconds timeout_;
     std::string where_;
@@ -190,7 +191,11 @@ public:
     void Write(std::span<const std::string_view> message) override {
         // liblxi marks every write with END, which the instrument takes for the message's end:
         // the parts go out as one.
+        std::size_t size = 0;
+        for (std::string_view part : message)
+            size += part.size();
         std::string whole;
+        whole.reserve(size);
         for (std::string_view part : message)
             whole += part;
         if (whole.size() > INT_MAX ||
