@@ -122,8 +122,46 @@ void CreateArbWaveform10M_PlainCopy(benchmark::State& state) {
     }
 }
 
+// What the scope view asks for at each refresh: 2000 samples of a channel playing a sequence of
+// `range(0)` steps of 64-point waveforms (as many different ones as the instrument holds).
+void RenderOutput_Sequence(benchmark::State& state) {
+    const auto steps = static_cast<ViInt32>(state.range(0));
+    ViSession vi = 0;
+    if (QZSimFgen_InitWithOptions("", VI_FALSE, VI_TRUE, "", &vi) != VI_SUCCESS) std::abort();
+    std::vector<ViInt32> handles(static_cast<std::size_t>(steps));
+    std::vector<ViReal64> points(64);
+    for (std::size_t k = 0; k < handles.size(); ++k) {
+        if (k >= 256) {
+            handles[k] = handles[k % 256];
+            continue;
+        }
+        for (std::size_t i = 0; i < points.size(); ++i)
+            points[i] = static_cast<double>((i + k) % 64) / 32.0 - 1.0;
+        if (QZSimFgen_CreateArbWaveform(vi, 64, points.data(), &handles[k]) != VI_SUCCESS)
+            std::abort();
+    }
+    const std::vector<ViInt32> loops(handles.size(), 2);
+    ViInt32 sequence = 0;
+    if (QZSimFgen_CreateArbSequence(vi, steps, handles.data(), loops.data(), &sequence) !=
+            VI_SUCCESS ||
+        QZSimFgen_ConfigureOutputMode(vi, IVIFGEN_VAL_OUTPUT_SEQ) != VI_SUCCESS ||
+        QZSimFgen_ConfigureArbSequence(vi, "1", sequence, 1.0, 0.0) != VI_SUCCESS ||
+        QZSimFgen_ConfigureOutputEnabled(vi, "1", VI_TRUE) != VI_SUCCESS ||
+        QZSimFgen_InitiateGeneration(vi) != VI_SUCCESS)
+        std::abort();
+    // The view spans the whole sequence, so every step is played.
+    std::vector<ViReal64> volts(2000);
+    const double step = 2.0 * 64 * steps / 1e6 / static_cast<double>(volts.size());
+    for (auto _ : state) {
+        QZSimFgen_RenderOutput(vi, "1", 0, step, static_cast<ViInt32>(volts.size()), volts.data());
+        benchmark::DoNotOptimize(volts.data());
+    }
+    QZSimFgen_close(vi);
+}
+
 } // namespace
 
+BENCHMARK(RenderOutput_Sequence)->Arg(1)->Arg(64)->Arg(1024)->Unit(benchmark::kMicrosecond);
 BENCHMARK(CreateArbWaveform10M_Simulator)->Unit(benchmark::kMillisecond);
 BENCHMARK(CreateArbWaveform10M_PlainCopy)->Unit(benchmark::kMillisecond);
 BENCHMARK(ConfigureStandardWaveform_Direct);

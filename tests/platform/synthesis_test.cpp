@@ -22,8 +22,12 @@ struct Bench {
     Bench() { channel.outputEnabled = true; }
 
     std::vector<double> Render(double rate, double seconds, std::vector<double> triggers = {}) {
+        return RenderFrom(0, rate, seconds, std::move(triggers));
+    }
+    std::vector<double> RenderFrom(double start, double rate, double seconds,
+                                   std::vector<double> triggers = {}) {
         std::vector<double> v(static_cast<std::size_t>(std::llround(rate * seconds)));
-        sim::Render({global, channel, waveforms, sequences, true}, triggers, 0, 1 / rate,
+        sim::Render({global, channel, waveforms, sequences, true}, triggers, start, 1 / rate,
                     static_cast<ViInt32>(v.size()), v.data());
         return v;
     }
@@ -158,6 +162,26 @@ TEST(Synthesis, ArbitraryOutputPlaysItsPointsAndASequenceItsStepsInOrder) {
     b.channel.arbOffset = 0;
     EXPECT_EQ(b.Render(1000, 0.009),
               (std::vector<double>{-0.25, 0.25, -0.25, 0.25, 0, 0.5, 1, -1, -0.25}));
+}
+
+// A view may start before generation did, or hours after it: the memory plays on as a loop.
+TEST(Synthesis, ArbitraryMemoryLoopsForAnyStartTime) {
+    Bench b;
+    b.global.outputMode = IVIFGEN_VAL_OUTPUT_ARB;
+    b.global.sampleRate = 1000;
+    b.waveforms[1] = {0, 0.5, 1, -1};
+    b.channel.waveformHandle = 1;
+    EXPECT_EQ(b.RenderFrom(-0.003, 1000, 0.006), (std::vector<double>{0.5, 1, -1, 0, 0.5, 1}));
+
+    b.global.outputMode = IVIFGEN_VAL_OUTPUT_SEQ;
+    b.sequences[7] = {{1}, {1}};
+    b.channel.sequenceHandle = 7;
+    EXPECT_EQ(b.RenderFrom(-0.001, 1000, 0.002), (std::vector<double>{-1, 0}));
+    for (double start : {-1e300, 1e300, 9.3e15}) {
+        const auto v = b.RenderFrom(start, 1000, 0.004);
+        for (double x : v)
+            EXPECT_TRUE(x == 0 || x == 0.5 || x == 1 || x == -1) << start << ": " << x;
+    }
 }
 
 TEST(Synthesis, NothingComesOutUntilGenerationRunsWithTheOutputOn) {

@@ -93,16 +93,6 @@ double ShapeIntegral(ViInt32 waveform, double p);
 double Modulating(const InternalSource& source, double t);
 double ModulatingIntegral(const InternalSource& source, double t);
 
-// The channel's carrier at `tau` seconds into its waveform, with offsets; `period` gets the time
-// of one cycle (the whole waveform or sequence for arbitrary output).
-double Carrier(const OutputState& out, double tau, double* period);
-// The software triggers that start a burst: one that comes while a burst runs is lost.
-std::vector<double> AcceptedTriggers(const OutputState& out,
-                                     const std::vector<double>& softwareTriggers);
-// The output at `t` seconds after generation started, given the accepted triggers.
-double Sample(const OutputState& out, double t, const std::vector<double>& triggers);
-// The same with the carrier's period given, as Render finds it once for all its samples.
-double Sample(const OutputState& out, double t, const std::vector<double>& triggers, double period);
 // `count` samples from `startTime`, `timeStep` apart.
 void Render(const OutputState& out, const std::vector<double>& softwareTriggers, double startTime,
             double timeStep, ViInt32 count, double* volts);
