@@ -4,4 +4,4 @@ set -euo pipefail
 cd "$(dirname "$0")/.."
 scripts/setup.sh
 scripts/build.sh build/release >/dev/null
-QT_QPA_PLATFORM=offscreen build/release/tests/widgets/grab_widgets docs/images
+QT_QPA_PLATFORM=offscreen build/release/tools/grab-widgets/grab_widgets docs/images
