@@ -2,7 +2,7 @@
 # Installs what the build needs from Debian's packages; quick when all is there already.
 set -euo pipefail
 packages=(cmake ninja-build g++ ccache clang-format libgtest-dev libgmock-dev libbenchmark-dev
-          qt6-base-dev qt6-svg-dev qt6-tools-dev libqt6opengl6-dev qt6-qpa-plugins libgl-dev fonts-dejavu-core pkgconf
+          qt6-base-dev qt6-svg-dev qt6-tools-dev libqt6opengl6-dev qt6-qpa-plugins libgl-dev fonts-dejavu-core fonts-liberation2 pkgconf
           pybind11-dev python3-dev python3-numpy python3-pytest clang libclang-rt-14-dev
           python3-pymeasure python3-pyvisa-py liblxi-dev)
 missing=()

@@ -145,6 +145,9 @@ XUIFgen1::XUIFgen1(QWidget* parent) : QWidget(parent) {
         cmdMulFactor[i] = button;
     }
     ShowDecadeButtons(true);
+    // The decade labels name the ends of the frequency knob's axis from the start, as they do
+    // once a session sets it; left to themselves they would show the bare "lbl".
+    ShowDecadeLabels(knobFgen[0]->Minimum());
     auto list = [&](XWinLabel*& label, QComboBox*& combo, const char* labelName,
                     const char* comboName, const char* caption, const char* tip, Place labelAt,
                     Place comboAt, bool waveforms) {

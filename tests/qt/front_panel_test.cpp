@@ -3,6 +3,7 @@
 // an error and a panel made mid-session show. Asserts on the widgets and on the driver call trace.
 #include "../platform/test_support.h"
 #include "qzivi/panels/XUIFgen1.h"
+#include "qzivi/panels/XWinLabel.h"
 #include "qzivi/qt/QZIviFgenWidget.h"
 #include "qzivi/support/timers.h"
 #include "qzivi/trace.h"
@@ -206,6 +207,19 @@ private slots:
         QCOMPARE(Control().Channels()->Item(1)->FuncAmplitude(), 3.0);
         QCOMPARE(field->text(), QStringLiteral("3.00 V"));
         Focus(Knob(1)); // settled: it may go
+    }
+
+    void theDecadeLabelsNameTheEndsOfTheFrequencyKnob() {
+        const auto ends = [&] {
+            return Child<XWinLabel>(QStringLiteral("lblFgen4"))->Shown() + " to " +
+                   Child<XWinLabel>(QStringLiteral("lblFgen5"))->Shown();
+        };
+        QCOMPARE(ends(), QStringLiteral("1 Hz to 10 Hz")); // the knob's axis before any session
+        Control().Configure();
+        QCOMPARE(ends(), QStringLiteral("100 Hz to 1 kHz")); // 1 kHz tops its decade
+        QTest::mouseClick(Decade(0), Qt::LeftButton);
+        QCOMPARE(ends(), QStringLiteral("1 kHz to 10 kHz"));
+        QCOMPARE(Field(0)->text(), QStringLiteral("10.000000 kHz"));
     }
 
     void theDecadeButtonsStopAtTheDriversLimits() {
