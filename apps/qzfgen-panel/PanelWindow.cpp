@@ -78,15 +78,17 @@ PanelWindow::PanelWindow(const QString& logicalName, QWidget* parent)
     right->addWidget(m_oLog);
     right->setStretchFactor(0, 3);
     right->setStretchFactor(1, 1);
-    auto* main = new QSplitter(Qt::Horizontal, this);
-    main->addWidget(m_oForm);
-    main->addWidget(right);
-    // The panel at its designed size, as on a bench; the scope takes what is left.
+    m_oSplit = new QSplitter(Qt::Horizontal, this);
+    m_oSplit->setObjectName("split");
+    m_oSplit->addWidget(m_oForm);
+    m_oSplit->addWidget(right);
+    m_oSplit->setChildrenCollapsible(false);
+    // The panel keeps its designed size, as on a bench; the scope gains and gives way first. The
+    // split the user drags is kept with the window's geometry.
     m_oForm->setMinimumSize(m_oForm->sizeHint() / 2);
-    main->setStretchFactor(0, 0);
-    main->setStretchFactor(1, 1);
-    main->setSizes({m_oForm->sizeHint().width(), 600});
-    setCentralWidget(main);
+    m_oSplit->setStretchFactor(0, 0);
+    m_oSplit->setStretchFactor(1, 1);
+    setCentralWidget(m_oSplit);
     m_oState = new QLabel(this);
     statusBar()->addPermanentWidget(m_oState);
     BuildMenus();
@@ -111,6 +113,7 @@ PanelWindow::PanelWindow(const QString& logicalName, QWidget* parent)
 
     QSettings settings = Settings();
     restoreGeometry(settings.value("geometry").toByteArray());
+    m_oSplit->restoreState(settings.value("split").toByteArray());
     FillRecent();
     m_oState->setText(tr("No session"));
     m_oScope->Capture(control, 0);
@@ -300,7 +303,11 @@ void PanelWindow::FillRecent() {
 }
 
 void PanelWindow::closeEvent(QCloseEvent* event) {
-    Settings().setValue("geometry", saveGeometry());
+    if (isVisible()) { // a window never shown has no layout worth keeping
+        QSettings settings = Settings();
+        settings.setValue("geometry", saveGeometry());
+        settings.setValue("split", m_oSplit->saveState());
+    }
     m_oLive.stop();
     qzivi::Quietly([&] {
         if (Control().SessionHandle() != 0) Control().CloseSession();

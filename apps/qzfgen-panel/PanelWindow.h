@@ -16,6 +16,7 @@ class QComboBox;
 class QLabel;
 class QMenu;
 class QPlainTextEdit;
+class QSplitter;
 
 namespace qzivi {
 class QZIviFgen;
@@ -64,6 +65,7 @@ private:
     void Command(const QString& what, F&& action);
 
     qzivi::QZIviFgenWidget* m_oForm;
+    QSplitter* m_oSplit;
     ScopeView* m_oScope;
     QPlainTextEdit* m_oLog;
     QComboBox* m_oTimeBase;

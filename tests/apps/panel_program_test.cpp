@@ -11,6 +11,7 @@
 #include <QMenuBar>
 #include <QPlainTextEdit>
 #include <QSettings>
+#include <QSplitter>
 #include <QTest>
 
 #include <cmath>
@@ -32,6 +33,7 @@ private slots:
     void init() {
         ::setenv("QZIVI_SESSION_MANAGER", "none", 1);
         store_ = std::make_unique<qzivi::test::StoreScope>();
+        QSettings("QZIviFgen", "qzfgen-panel").clear(); // Qt reads the settings folder only once
     }
     void cleanup() { store_.reset(); }
 
@@ -90,6 +92,28 @@ private slots:
         PanelWindow again("SampleFGen");
         QVERIFY(again.OpenFile(copy));
         QCOMPARE(again.Control().Channels()->Count(), 2);
+    }
+
+    void thePanelKeepsItsDesignedWidthAndTheSplitIsRemembered() {
+        const int designed = qzivi::QZIviFgenWidget().sizeHint().width();
+        int dragged = 0;
+        {
+            PanelWindow w("SampleFGen");
+            w.resize(designed + 400, 560); // narrower than the panel and the scope would like
+            w.show();
+            QCOMPARE(w.Form().width(), designed);
+            w.resize(designed + 700, 560);
+            QCOMPARE(w.Form().width(), designed); // the scope takes the new room
+            auto* split = w.findChild<QSplitter*>("split");
+            QVERIFY(split);
+            split->setSizes({designed + 100, 600});
+            dragged = w.Form().width();
+            QVERIFY(dragged > designed);
+            w.close();
+        }
+        PanelWindow again("SampleFGen");
+        again.show();
+        QCOMPARE(again.Form().width(), dragged);
     }
 };
 
