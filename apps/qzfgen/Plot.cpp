@@ -14,6 +14,22 @@ namespace qzfgen {
 
 #ifdef QZFGEN_HAVE_QT
 
+// A scale's text, as a scope writes it: 2e-4, "s/div" give "200 µs/div".
+QString Scale(double value, const char* unit) {
+    QString text = QString::fromStdString(Engineering(value, unit));
+    const qsizetype blank = text.indexOf(' ');
+    if (blank > 0 && text.left(blank).contains('.')) { // "200.000" to "200", "2.500" to "2.5"
+        qsizetype end = blank;
+        while (text[end - 1] == '0')
+            --end;
+        if (text[end - 1] == '.') --end;
+        text.remove(end, blank - end);
+    }
+    const qsizetype prefix = text.indexOf(' ') + 1;
+    if (prefix > 0 && prefix < text.size() && text[prefix] == 'u') text[prefix] = QChar(0xB5);
+    return text;
+}
+
 // A scope's look: black ground, a grid of 10 by 8, the trace in yellow, the scale in words.
 bool WritePlot(const std::string& path, const std::vector<double>& volts, double rate,
                const std::string& title) {
@@ -28,7 +44,7 @@ bool WritePlot(const std::string& path, const std::vector<double>& volts, double
     image.fill(Qt::black);
     QPainter painter(&image);
     painter.setRenderHint(QPainter::Antialiasing);
-    const QRectF plot(50, 30, 830, 300);
+    const QRectF plot(70, 30, 810, 300);
     painter.setPen(QPen(QColor(70, 70, 70), 1));
     for (int i = 0; i <= 10; ++i)
         painter.drawLine(QPointF(plot.left() + plot.width() * i / 10, plot.top()),
@@ -54,10 +70,19 @@ bool WritePlot(const std::string& path, const std::vector<double>& volts, double
     painter.drawPath(trace);
     painter.setPen(Qt::lightGray);
     painter.drawText(QPointF(plot.left(), 20), QString::fromStdString(title));
-    painter.drawText(QPointF(4, plot.top() + 4), QString::number(top, 'g', 3) + " V");
-    painter.drawText(QPointF(4, plot.bottom()), QString::number(bottom, 'g', 3) + " V");
-    painter.drawText(QPointF(plot.right() - 160, 350),
-                     QString("%1 samples at %2 S/s").arg(volts.size()).arg(rate, 0, 'g', 4));
+    // The highest and lowest levels are marked where the trace has them, inside the margin.
+    for (const double level : {top, bottom}) {
+        const double at = y(level);
+        painter.drawLine(QPointF(plot.left() - 4, at), QPointF(plot.left(), at));
+        painter.drawText(QRectF(0, at - 10, plot.left() - 6, 20), Qt::AlignRight | Qt::AlignVCenter,
+                         Scale(level, "V"));
+    }
+    const double seconds = static_cast<double>(volts.size()) / rate;
+    painter.drawText(QRectF(plot.left(), plot.bottom() + 4, plot.width(), 24),
+                     Qt::AlignLeft | Qt::AlignVCenter, Scale(seconds / 10, "s/div"));
+    painter.drawText(QRectF(plot.left(), plot.bottom() + 4, plot.width(), 24),
+                     Qt::AlignRight | Qt::AlignVCenter,
+                     QString("%1 samples at %2").arg(volts.size()).arg(Scale(rate, "S/s")));
     painter.end();
     if (!image.save(QString::fromStdString(path), "PNG"))
         throw std::runtime_error("\"" + path + "\" cannot be written");

@@ -4,6 +4,10 @@
 
 #include <gtest/gtest.h>
 
+#ifdef QZFGEN_HAS_PNG
+#include <QImage>
+#endif
+
 #include <cmath>
 #include <cstdio>
 #include <filesystem>
@@ -196,12 +200,43 @@ TEST_F(QzfgenTest, RenderWritesTheSimulatorsSamples) {
         ++rows;
     }
     EXPECT_EQ(rows, 200);
-#ifdef QZFGEN_HAS_PNG
-    const std::string png = Path("out.png");
-    ASSERT_EQ(Run("render --channel Channel2 --points 500 --png " + png).code, 0);
-    EXPECT_EQ(Slurp(png).substr(1, 3), "PNG");
-#endif
 }
+
+#ifdef QZFGEN_HAS_PNG
+// The picture's scale marks the highest and the lowest level beside the rows where the trace
+// reaches them, as a reader of the plot takes them.
+TEST_F(QzfgenTest, ThePlotMarksItsLevelsWhereTheTraceReachesThem) {
+    const std::string png = Path("out.png");
+    const Ran ran = Run("render --channel Channel2 --points 500 --png " + png);
+    ASSERT_EQ(ran.code, 0) << ran.err;
+    const QImage image(QString::fromStdString(png));
+    ASSERT_FALSE(image.isNull());
+    const auto yellow = [&](int x, int y) {
+        const QColor c = image.pixelColor(x, y);
+        return c.red() > 120 && c.green() > 100 && c.blue() < 60;
+    };
+    int left = image.width(), top = image.height(), bottom = -1;
+    for (int y = 0; y < image.height(); ++y)
+        for (int x = 0; x < image.width(); ++x)
+            if (yellow(x, y)) {
+                left = std::min(left, x);
+                top = std::min(top, y);
+                bottom = std::max(bottom, y);
+            }
+    ASSERT_LT(top, bottom) << "no trace drawn";
+    // A mark: light grey, left of where the trace begins, within a row of the level.
+    const auto marked = [&](int row) {
+        for (int y = row - 1; y <= row + 1; ++y)
+            for (int x = 0; x < left; ++x) {
+                const QColor c = image.pixelColor(x, y);
+                if (c.red() > 100 && c.red() == c.green() && c.green() == c.blue()) return true;
+            }
+        return false;
+    };
+    EXPECT_TRUE(marked(top)) << "row " << top;
+    EXPECT_TRUE(marked(bottom)) << "row " << bottom;
+}
+#endif
 
 TEST_F(QzfgenTest, EveryCommandExplainsItself) {
     for (const char* command :
