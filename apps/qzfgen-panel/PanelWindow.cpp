@@ -90,6 +90,7 @@ PanelWindow::PanelWindow(const QString& logicalName, QWidget* parent)
     m_oSplit->setStretchFactor(1, 1);
     setCentralWidget(m_oSplit);
     m_oState = new QLabel(this);
+    m_oState->setObjectName("state");
     statusBar()->addPermanentWidget(m_oState);
     BuildMenus();
 
@@ -174,10 +175,11 @@ void PanelWindow::BuildMenus() {
 
 // A failure that the control raised after telling it as IviError is in the log already.
 template <typename F>
-void PanelWindow::Command(const QString& what, F&& action) {
+bool PanelWindow::Command(const QString& what, F&& action) {
     const int errors = m_nErrors;
     try {
         action();
+        return m_nErrors == errors;
     } catch (const qzivi::Failure& failure) {
         if (m_nErrors == errors)
             Note(tr("%1 failed: error %2: %3")
@@ -187,6 +189,7 @@ void PanelWindow::Command(const QString& what, F&& action) {
     } catch (const std::exception& e) {
         Note(tr("%1 failed: %2").arg(what, QString::fromUtf8(e.what())));
     }
+    return false;
 }
 
 void PanelWindow::Note(const QString& text) {
@@ -195,16 +198,13 @@ void PanelWindow::Note(const QString& text) {
 }
 
 bool PanelWindow::OpenFile(const QString& path) {
-    bool done = false;
-    Command(tr("Open"), [&] {
+    const bool done = Command(tr("Open"), [&] {
         auto& configurations = *Control().Configurations();
         const auto added = configurations.Add("file", path.toStdString());
         if (!added) return; // the error is in the log
-        const int errors = m_nErrors;
         added->Load();
         configurations.Remove(configurations.Count());
         if (!m_sName.isEmpty()) Control().LogicalName(m_sName.toStdString()); // --name wins
-        done = m_nErrors == errors;
     });
     if (!done) return false;
     m_sFile = path;
@@ -215,15 +215,12 @@ bool PanelWindow::OpenFile(const QString& path) {
 }
 
 bool PanelWindow::SaveFile(const QString& path) {
-    bool done = false;
-    Command(tr("Save"), [&] {
+    const bool done = Command(tr("Save"), [&] {
         auto& configurations = *Control().Configurations();
         const auto added = configurations.Add("saved");
         if (!added) return;
-        const int errors = m_nErrors;
         added->Export(path.toStdString());
         configurations.Remove(configurations.Count());
-        done = m_nErrors == errors;
     });
     if (!done) return false;
     m_sFile = path;
@@ -242,14 +239,14 @@ void PanelWindow::Configure() {
 }
 
 void PanelWindow::Initiate() {
-    Command(tr("Initiate"), [&] { Control().Initiate(); });
+    if (!Command(tr("Initiate"), [&] { Control().Initiate(); })) return;
     m_oRunning.start();
     m_oLive.start();
     m_oState->setText(tr("Generating"));
 }
 
 void PanelWindow::Abort() {
-    Command(tr("Abort"), [&] { Control().Abort(); });
+    if (!Command(tr("Abort"), [&] { Control().Abort(); })) return; // it may generate still
     m_oLive.stop();
     m_oState->setText(tr("Stopped"));
 }

@@ -61,8 +61,9 @@ private:
     void Note(const QString& text);
     void Remember(const QString& path);
     void FillRecent();
+    // Runs one of the user's commands; false when it failed, with the failure in the log.
     template <typename F>
-    void Command(const QString& what, F&& action);
+    bool Command(const QString& what, F&& action);
 
     qzivi::QZIviFgenWidget* m_oForm;
     QSplitter* m_oSplit;

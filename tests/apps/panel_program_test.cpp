@@ -7,6 +7,7 @@
 #include "qzivi/qt/QZIviFgenWidget.h"
 #include "qzivi/widgets/QZButton.h"
 
+#include <QLabel>
 #include <QMenu>
 #include <QMenuBar>
 #include <QPlainTextEdit>
@@ -76,6 +77,13 @@ private slots:
         QVERIFY2(w.Log().toPlainText().contains("NoSuchGenerator"),
                  qPrintable(w.Log().toPlainText()));
         QCOMPARE(w.Control().Channels()->Count(), 2); // the example's tree still stands
+        // A refused start leaves the window's state as it was: nothing claims to generate.
+        auto* state = w.findChild<QLabel*>("state");
+        QVERIFY(state);
+        const QString before = state->text();
+        w.Initiate();
+        QCOMPARE(state->text(), before);
+        QVERIFY2(w.Log().toPlainText().contains("Error -31600"), qPrintable(w.Log().toPlainText()));
     }
 
     void theLastFileAndTheRecentOnesAreRemembered() {
