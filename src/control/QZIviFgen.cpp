@@ -247,8 +247,10 @@ void QZIviFgen::AmbientChanged(const std::string& name) {
 }
 
 void QZIviFgen::SetDisplayName(const std::string& name) {
-    m_sDisplayName = name;
-    m_oProp->SetPath(name);
+    // Without a host, or with one that gives no name, error sources start with the class's name,
+    // not with a bare "." ("QZIviFgen.Channels.Item").
+    m_sDisplayName = name.empty() ? "QZIviFgen" : name;
+    m_oProp->SetPath(m_sDisplayName);
 }
 
 // ---- Methods -----------------------------------------------------------------------------------

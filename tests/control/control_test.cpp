@@ -406,7 +406,7 @@ TEST_F(DirectControlTest, WithoutAHostTheControlStillWorks) {
     control.InitProperties();
     control.Init();
     EXPECT_NE(control.SessionHandle(), 0);
-    EXPECT_EQ(control.Channels()->Path(), ".Channels.");
+    EXPECT_EQ(control.Channels()->Path(), "QZIviFgen.Channels.");
 }
 
 } // namespace

@@ -108,7 +108,7 @@ TEST_F(EngineTest, TheGateHasThreeOutcomes) {
     EXPECT_TRUE(errors_.empty());
     fgen_->Enabled(true);
     EXPECT_EQ(Raised([&] { fgen_->Configure(); }), -31620);
-    EXPECT_EQ(lastRaised_->Description(), "No channels were found. (.Configure)");
+    EXPECT_EQ(lastRaised_->Description(), "No channels were found. (QZIviFgen.Configure)");
     EXPECT_TRUE(trace.Records().empty()) << "no session was opened";
     fgen_->Channels()->Add();
     fgen_->Extensions(qzivifgenTriggerExt | qzivifgenModulateAMExt);
@@ -138,10 +138,10 @@ TEST_F(EngineTest, ARefusedValueNamesItsOwnersProperty) {
         std::function<void(QZIviFgen&)> set;
         std::string source;
     };
-    const std::string ch = ".Channels.Item(\"Channel1\").";
+    const std::string ch = "QZIviFgen.Channels.Item(\"Channel1\").";
     const std::vector<Case> cases = {
-        {[](QZIviFgen& f) { f.OutputMode(7); }, ".OutputMode"},
-        {[](QZIviFgen& f) { f.RefClockSource(55); }, ".RefClockSource"},
+        {[](QZIviFgen& f) { f.OutputMode(7); }, "QZIviFgen.OutputMode"},
+        {[](QZIviFgen& f) { f.RefClockSource(55); }, "QZIviFgen.RefClockSource"},
         {[](QZIviFgen& f) { f.Channels()->Item(1)->OutputImpedance(-5); }, ch + "OutputImpedance"},
         {[](QZIviFgen& f) { f.Channels()->Item(1)->OperationMode(9); }, ch + "OperationMode"},
         {[](QZIviFgen& f) { f.Channels()->Item(1)->FuncWaveform(42); }, ch + "FuncWaveform"},
@@ -169,19 +169,19 @@ TEST_F(EngineTest, ARefusedValueNamesItsOwnersProperty) {
              f.Channels()->Item(1)->AMEnabled(true);
              f.Internal()->AMInternalDepth(500);
          },
-         ".Internal.AMInternalDepth"},
+         "QZIviFgen.Internal.AMInternalDepth"},
         {[](QZIviFgen& f) {
              f.Extensions(qzivifgenStdFuncExt | qzivifgenTriggerExt | qzivifgenInternalTriggerExt);
              f.Channels()->Item(1)->TriggerSource(3);
              f.Internal()->InternalTriggerRate(0);
          },
-         ".Internal.InternalTriggerRate"},
+         "QZIviFgen.Internal.InternalTriggerRate"},
         {[](QZIviFgen& f) {
              f.OutputMode(1);
              f.ArbSampleRate(1e12);
              f.Waveforms()->Add("W")->Data(std::vector<double>(16, 0.5));
          },
-         ".ArbSampleRate"},
+         "QZIviFgen.ArbSampleRate"},
         {[](QZIviFgen& f) {
              f.OutputMode(1);
              f.Waveforms()->Add("W")->Data(std::vector<double>(16, 0.5));
@@ -300,7 +300,7 @@ TEST_F(EngineTest, RenderOutputNeedsASessionAndGivesTheDriversSamples) {
         engine.RenderOutput("Channel7", 0, 1e-4, 2);
         ADD_FAILURE() << "an unknown channel renders nothing";
     } catch (const Failure& f) {
-        EXPECT_EQ(f.Source(), ".RenderOutput");
+        EXPECT_EQ(f.Source(), "QZIviFgen.RenderOutput");
     }
 }
 
@@ -311,7 +311,7 @@ TEST_F(EngineTest, GenerationControlNeedsAConfiguredSession) {
     EXPECT_EQ(Raised([&] { fgen_->Initiate(); }), -31601);
     EXPECT_EQ(lastRaised_->Description(),
               "To access this property or method, you must first configure the device by "
-              "calling the Configure method. (.Initiate)");
+              "calling the Configure method. (QZIviFgen.Initiate)");
     EXPECT_EQ(Raised([&] { fgen_->SendSoftwareTrigger(); }), -31601);
     EXPECT_EQ(Raised([&] { fgen_->Abort(); }), 0) << "Abort works on an initialized session";
     EXPECT_EQ(State(), IviStateInitialized);
@@ -402,7 +402,7 @@ TEST_F(EngineTest, NoWaveformAtAllStopsTheFirstChannel) {
     fgen_->OutputMode(1);
     fgen_->Channels()->Add();
     EXPECT_EQ(Raised([&] { fgen_->Configure(); }), -31622);
-    EXPECT_EQ(lastRaised_->Description(), "No waveform found. (.Configure)");
+    EXPECT_EQ(lastRaised_->Description(), "No waveform found. (QZIviFgen.Configure)");
     fgen_->Extensions(qzivifgenArbWfmExt);
     fgen_->OutputMode(0);
     EXPECT_EQ(Raised([&] { fgen_->Configure(); }), -31628) << "mode 0 without its extension";
@@ -652,7 +652,7 @@ TEST_F(EngineTest, AttributesReadInEveryTypeAndReadFailuresRaise) {
     EXPECT_FALSE(
         io.CheckAttributeVi(AttrType::Real64, IVIFGEN_ATTR_FUNC_FREQUENCY, 2e8, "Channel1"));
     EXPECT_EQ(Raised([&] { io.GetAttributeVi(AttrType::Int32, 1259999, ""); }), -30712);
-    EXPECT_EQ(lastRaised_->Source(), ".GetAttribute");
+    EXPECT_EQ(lastRaised_->Source(), "QZIviFgen.GetAttribute");
 }
 
 } // namespace

@@ -87,7 +87,8 @@ public:
     Event<> Configured;
     Event<> Initialized;
 
-    // The host's name of this control; it prefixes every error source of the property tree.
+    // The host's name of this control, "QZIviFgen" where it has none; it prefixes every error
+    // source of the property tree.
     const std::string& DisplayName() const { return m_sDisplayName; }
 
     // The engine, for the panels and pages that sit on this control.
