@@ -404,6 +404,11 @@ PYBIND11_MODULE(qzivifgen, m) {
              py::call_guard<py::gil_scoped_release>())
         .def("CloseSession", &QZIviFgen::CloseSession, py::call_guard<py::gil_scoped_release>())
         .def("GetLastIviError", &QZIviFgen::GetLastIviError)
+        .def("__repr__",
+             [](Fgen& f) {
+                 return "<QZIviFgen " + f.LogicalName() +
+                        (f.SessionHandle() != 0 ? ", session open>" : ">");
+             })
         .def(
             "RenderOutput",
             [](Fgen& f, const std::string& channel, double start, double step, std::int32_t count) {

@@ -48,6 +48,7 @@ def test_failures_are_exceptions_with_number_source_and_text():
     assert caught.value.number == -31624
     assert "does not exist" in caught.value.description
     assert caught.value.source.endswith("Item")
+    assert caught.value.description.endswith("(QZIviFgen.Channels.Item)")  # where, from the top
     fgen.LogicalName = "NoSuchGenerator"
     with pytest.raises(q.QZIviFgenError) as caught:
         fgen.Init()
@@ -64,6 +65,8 @@ def test_failures_are_exceptions_with_number_source_and_text():
     with pytest.raises(IndexError):
         fgen.Channels[3]
     assert fgen.Channels[-1].Name == "Channel1" and "Channel1" in fgen.Channels
+    assert repr(fgen) == "<QZIviFgen NoSuchGenerator>"
+    assert repr(fgen.Channels[0]) == "<QZIviFgenChannel Channel1>"
 
 
 @pytest.mark.filterwarnings("ignore::pytest.PytestUnraisableExceptionWarning")
