@@ -4,6 +4,6 @@
 #                                      repeats one seed alone)
 set -euo pipefail
 cd "$(dirname "$0")/.."
-scripts/build.sh build/release >/dev/null
+scripts/build.sh build/release -DQZIVI_BUILD_TESTS=ON >/dev/null
 QZIVI_RANDOM_OPS=${1:-100000} QZIVI_RANDOM_SEED=${2:-0} QZIVI_SESSION_MANAGER=none \
   build/release/tests/control/control_tests --gtest_filter='RandomOperations*'
