@@ -209,6 +209,23 @@ private slots:
         Focus(Knob(1)); // settled: it may go
     }
 
+    // The panel is drawn in Arial's metrics; in a wider font the captions would run out of their
+    // labels at the designed size.
+    void everyCaptionFitsItsLabelAtTheDesignedSize() {
+        Control().Configure();
+        form_->resize(form_->sizeHint());
+        QTRY_COMPARE(Child<XUIFgen1>(QString())->size(), form_->sizeHint());
+        const auto labels = form_->findChildren<XWinLabel*>();
+        QVERIFY(labels.size() >= 8);
+        for (const XWinLabel* label : labels) {
+            const int needed = QFontMetrics(label->Font()).horizontalAdvance(label->Shown());
+            QVERIFY2(needed <= label->width(), qPrintable(QStringLiteral("\"%1\" needs %2 of %3 px")
+                                                              .arg(label->Shown())
+                                                              .arg(needed)
+                                                              .arg(label->width())));
+        }
+    }
+
     void theDecadeLabelsNameTheEndsOfTheFrequencyKnob() {
         const auto ends = [&] {
             return Child<XWinLabel>(QStringLiteral("lblFgen4"))->Shown() + " to " +
