@@ -14,6 +14,8 @@ namespace qzfgen {
 
 #ifdef QZFGEN_HAVE_QT
 
+namespace {
+
 // A scale's text, as a scope writes it: 2e-4, "s/div" give "200 µs/div".
 QString Scale(double value, const char* unit) {
     QString text = QString::fromStdString(Engineering(value, unit));
@@ -29,6 +31,8 @@ QString Scale(double value, const char* unit) {
     if (prefix > 0 && prefix < text.size() && text[prefix] == 'u') text[prefix] = QChar(0xB5);
     return text;
 }
+
+} // namespace
 
 // A scope's look: black ground, a grid of 10 by 8, the trace in yellow, the scale in words.
 bool WritePlot(const std::string& path, const std::vector<double>& volts, double rate,
