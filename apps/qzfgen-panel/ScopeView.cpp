@@ -1,6 +1,7 @@
 #include "ScopeView.h"
 
 #include "qzivi/control/QZIviFgen.h"
+#include "qzivi/panels/MUiAndStringUtil.h"
 #include "qzivi/support/failure.h"
 
 #include <QPainter>
@@ -25,12 +26,7 @@ double Step125(double value) {
 }
 
 QString Si(double value, const char* unit) {
-    static const std::pair<double, const char*> kPrefixes[] = {
-        {1e6, "M"}, {1e3, "k"}, {1, ""}, {1e-3, "m"}, {1e-6, "µ"}, {1e-9, "n"}};
-    for (const auto& [scale, prefix] : kPrefixes)
-        if (std::fabs(value) >= scale * 0.999)
-            return QStringLiteral("%1 %2%3").arg(value / scale, 0, 'g', 3).arg(prefix, unit);
-    return QStringLiteral("%1 %2").arg(value, 0, 'g', 3).arg(unit);
+    return QString::fromStdString(qzivi::FormatScale(value, unit));
 }
 
 } // namespace

@@ -44,6 +44,12 @@ void Load(QZIviFgen& fgen, const std::string& file) {
     fgen.Configurations()->Add("file", file)->Load();
 }
 
+std::string Engineering(double value, const char* unit) {
+    std::string text = qzivi::FormatEngineering(value, 3); // " 2.500 k": the blank of the sign
+    if (!text.empty() && text[0] == ' ') text.erase(0, 1);
+    return text + unit;
+}
+
 // "Sine" for 1, from the names the pages show.
 std::string FunctionName(std::int32_t waveform) {
     static const char* const kNames[] = {"",        "Sine",      "Square", "Triangle",
@@ -414,12 +420,6 @@ plot picture with --png. Needs a driver that renders, as the simulator does.
 // clang-format on
 
 } // namespace
-
-std::string Engineering(double value, const char* unit) {
-    std::string text = qzivi::FormatEngineering(value, 3); // " 2.500 k": the blank of the sign
-    if (!text.empty() && text[0] == ' ') text.erase(0, 1);
-    return text + unit;
-}
 
 std::span<const Command> Commands() {
     return kCommands;

@@ -17,9 +17,6 @@ struct Command {
 
 std::span<const Command> Commands();
 
-// A value with an engineering prefix and its unit: 2500, "Hz" give "2.500 kHz".
-std::string Engineering(double value, const char* unit);
-
 // Writes a plot of `volts`, sampled `rate` times a second, as a PNG picture; false where this
 // build has no Qt layer to draw with.
 bool WritePlot(const std::string& path, const std::vector<double>& volts, double rate,

@@ -1,6 +1,8 @@
 #include "Commands.h"
 
 #ifdef QZFGEN_HAVE_QT
+#include "qzivi/panels/MUiAndStringUtil.h"
+
 #include <QGuiApplication>
 #include <QImage>
 #include <QPainter>
@@ -16,20 +18,8 @@ namespace qzfgen {
 
 namespace {
 
-// A scale's text, as a scope writes it: 2e-4, "s/div" give "200 µs/div".
 QString Scale(double value, const char* unit) {
-    QString text = QString::fromStdString(Engineering(value, unit));
-    const qsizetype blank = text.indexOf(' ');
-    if (blank > 0 && text.left(blank).contains('.')) { // "200.000" to "200", "2.500" to "2.5"
-        qsizetype end = blank;
-        while (text[end - 1] == '0')
-            --end;
-        if (text[end - 1] == '.') --end;
-        text.remove(end, blank - end);
-    }
-    const qsizetype prefix = text.indexOf(' ') + 1;
-    if (prefix > 0 && prefix < text.size() && text[prefix] == 'u') text[prefix] = QChar(0xB5);
-    return text;
+    return QString::fromStdString(qzivi::FormatScale(value, unit));
 }
 
 } // namespace

@@ -77,6 +77,15 @@ TEST(FormatEngineering, PicksThePrefixByTheComputedLogarithm) {
     EXPECT_EQ(RepeatChar("xyz", 3), "xxx");
 }
 
+TEST(FormatScale, WritesAScopesScales) {
+    EXPECT_EQ(FormatScale(2e-4, "s/div"), "200 \u00b5s/div");
+    EXPECT_EQ(FormatScale(2.5e6, "S/s"), "2.5 MS/s");
+    EXPECT_EQ(FormatScale(0.9999999, "V"), "1 V") << "a hair below a unit is the unit";
+    EXPECT_EQ(FormatScale(-0.5, "V"), "-500 mV");
+    EXPECT_EQ(FormatScale(0, "V"), "0 V");
+    EXPECT_EQ(FormatScale(3e-12, "s"), "3e-12 s") << "below nano no prefix";
+}
+
 TEST(FormatEngineering, ReadsBackTheSameUnderAnyLocale) {
     const char* previous = std::setlocale(LC_NUMERIC, nullptr);
     const std::string saved = previous != nullptr ? previous : "C";

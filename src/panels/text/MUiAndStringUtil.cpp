@@ -7,6 +7,7 @@
 #include <charconv>
 #include <cmath>
 #include <cstdlib>
+#include <utility>
 
 namespace qzivi {
 
@@ -216,6 +217,23 @@ ComboChoice SelectComboEntry(const std::vector<ComboEntry>& entries, const Varia
             choice.text = asText();
     }
     return choice;
+}
+
+std::string FormatScale(double value, std::string_view unit) {
+    static const std::pair<double, const char*> kPrefixes[] = {
+        {1e6, "M"}, {1e3, "k"}, {1, ""}, {1e-3, "m"}, {1e-6, "\u00b5"}, {1e-9, "n"}};
+    double scaled = value;
+    const char* prefix = "";
+    for (const auto& [scale, letter] : kPrefixes)
+        if (std::fabs(value) >= scale * 0.999) {
+            scaled = value / scale;
+            prefix = letter;
+            break;
+        }
+    char number[32];
+    const auto end =
+        std::to_chars(number, number + sizeof number, scaled, std::chars_format::general, 3).ptr;
+    return std::string(number, end) + " " + prefix + std::string(unit);
 }
 
 } // namespace qzivi

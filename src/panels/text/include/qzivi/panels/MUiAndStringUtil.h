@@ -24,6 +24,10 @@ void FormatValueWithUnit(std::string_view input, std::string& text, double& valu
 // A blank for a value of 0 or more, the value scaled under `decimals`, a blank, the prefix.
 std::string FormatEngineering(double value, std::int32_t decimals);
 
+// A scale as a scope writes it: three significant digits and an SI prefix from nano to mega,
+// UTF-8: 2e-4, "s/div" give "200 µs/div"; 2.5e6, "S/s" give "2.5 MS/s".
+std::string FormatScale(double value, std::string_view unit);
+
 // The exponent of an engineering prefix letter, case sensitive; 0 for any other character.
 std::int32_t PrefixExponent(char c);
 
